@@ -1,0 +1,17 @@
+#pragma once
+
+class QDataStream;
+
+// An object that travels as QDataStream data between the host and its clients.
+class IRawDataObject
+{
+public:
+    virtual ~IRawDataObject() = default;
+    virtual void ReadDataFromDataStream(QDataStream &stream) = 0;
+    virtual void WriteDataToDataStream(QDataStream &stream) const = 0;
+    virtual IRawDataObject &operator=(const IRawDataObject &) { return *this; }
+
+protected:
+    IRawDataObject() = default;
+    IRawDataObject(const IRawDataObject &) = default;
+};
