@@ -18,10 +18,8 @@ void PendingExchanges::Count::done()
 }
 
 PendingExchanges::PendingExchanges(IKoltTunnelClient *tunnel)
-    : m_tunnel(tunnel)
-    , m_count(std::make_shared<Count>())
-{
-}
+    : m_tunnel(tunnel), m_count(std::make_shared<Count>())
+{}
 
 PendingExchanges::~PendingExchanges() = default;
 
@@ -61,9 +59,9 @@ bool PendingExchanges::SendRequest(const QString &pluginId, void *clientId, int 
     // another exchange as done.
     auto answered = std::make_shared<std::atomic<bool>>(false);
     TunnelResponseHandler handler = std::move(request.onResponse);
-    request.onResponse = [count = m_count, answered, handler](
-                             bool ok, const QString &status, const QString &detail,
-                             const QString &code, const QString &content, bool flag) {
+    request.onResponse = [count = m_count, answered,
+                          handler](bool ok, const QString &status, const QString &detail,
+                                   const QString &code, const QString &content, bool flag) {
         if (handler)
             handler(ok, status, detail, code, content, flag);
         if (!answered->exchange(true))

@@ -10,8 +10,7 @@ PluginLibrary::PluginLibrary(const QString &fileName, const QString &interfaceId
     : m_fileName(QFileInfo(fileName).absoluteFilePath())
     , m_interfaceId(interfaceId)
     , m_pluginId(pluginId)
-{
-}
+{}
 
 PluginLibrary::~PluginLibrary()
 {
@@ -57,8 +56,8 @@ bool PluginLibrary::load()
         return fail(m_loader.errorString());
     m_plugin = qobject_cast<IPluginObjectBase *>(m_instance.data());
     if (!m_plugin)
-        return fail(QStringLiteral("the plug-in object does not implement \"%1\"")
-                        .arg(m_interfaceId));
+        return fail(
+            QStringLiteral("the plug-in object does not implement \"%1\"").arg(m_interfaceId));
     return true;
 }
 

@@ -2,8 +2,10 @@
 
 ResponseCallback ReplyCollector::replyFunction(int request)
 {
-    return [this, request](bool flag, const QString &code, const QString &text,
-                           const QVariant &data) { record(request, Reply{flag, code, text, data}); };
+    return
+        [this, request](bool flag, const QString &code, const QString &text, const QVariant &data) {
+            record(request, Reply{flag, code, text, data});
+        };
 }
 
 void ReplyCollector::record(int request, Reply reply)

@@ -7,6 +7,7 @@
 #include "HostRequest.h"
 #include "JsonValues.h"
 #include "LocalTunnel.h"
+#include "PendingExchanges.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "RecordingServer.h"
 #include "RequestRunner.h"
@@ -181,10 +182,8 @@ int runSession(const HostOptions &options)
     }
     const std::optional<std::vector<HostRequest>> requests = readSession(*text, &error);
     if (!requests) {
-        printError(QStringLiteral("%1: %2")
-                       .arg(fileName == QLatin1String("-") ? QStringLiteral("standard input")
-                                                           : fileName,
-                            error));
+        printError(QStringLiteral("%1: %2").arg(
+            fileName == QLatin1String("-") ? QStringLiteral("standard input") : fileName, error));
         return ExitUsage;
     }
     return runRequests(options, *requests);

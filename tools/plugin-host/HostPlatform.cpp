@@ -10,7 +10,8 @@
 #include <QDir>
 #include <QStandardPaths>
 
-HostPlatform::HostPlatform(const HostOptions &options) : m_options(options) {}
+HostPlatform::HostPlatform(const HostOptions &options) : m_options(options)
+{}
 
 HostPlatform::~HostPlatform()
 {
@@ -22,9 +23,9 @@ HostPlatform::~HostPlatform()
 
 bool HostPlatform::loadPlugin(QString *error)
 {
-    m_library = std::make_unique<PluginLibrary>(
-        m_options.pluginFile, QStringLiteral(PLUGIN_SERVER_INTERFACE_IID),
-        PluginRecordingScheduleSettingCommon::PluginId);
+    m_library = std::make_unique<PluginLibrary>(m_options.pluginFile,
+                                                QStringLiteral(PLUGIN_SERVER_INTERFACE_IID),
+                                                PluginRecordingScheduleSettingCommon::PluginId);
     if (m_library->load())
         return true;
     *error = QStringLiteral("the plug-in does not load: %1").arg(m_library->errorString());
@@ -51,8 +52,8 @@ bool HostPlatform::startTunnel(QString *error)
     tunnelOptions.faults = m_options.faults;
     tunnelOptions.faultSeed = m_options.faultSeed;
     tunnelOptions.exchangeLogPath = m_options.exchangesFile;
-    m_tunnel = std::make_unique<LocalTunnel>(recordingServerBackend(database, layout),
-                                             tunnelOptions);
+    m_tunnel =
+        std::make_unique<LocalTunnel>(recordingServerBackend(database, layout), tunnelOptions);
     if (!m_tunnel->IsConnected()) {
         *error = QStringLiteral("the server does not start: %1").arg(m_tunnel->errorString());
         return false;

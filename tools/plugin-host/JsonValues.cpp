@@ -2,6 +2,7 @@
 
 #include <QJsonArray>
 #include <QJsonDocument>
+#include <QJsonObject>
 #include <QJsonParseError>
 
 namespace JsonValues {
@@ -11,9 +12,8 @@ std::optional<QJsonValue> parse(const QByteArray &text, QString *error)
     // QJsonDocument takes only objects and arrays; a scalar is read inside
     // an array of one.
     QJsonParseError parseError{};
-    const QJsonDocument document =
-        QJsonDocument::fromJson(QByteArrayLiteral("[") + text + QByteArrayLiteral("]"),
-                                &parseError);
+    const QJsonDocument document = QJsonDocument::fromJson(
+        QByteArrayLiteral("[") + text + QByteArrayLiteral("]"), &parseError);
     if (parseError.error != QJsonParseError::NoError) {
         if (error)
             *error = QStringLiteral("%1 at character %2")

@@ -10,7 +10,8 @@
 #include <chrono>
 #include <exception>
 
-RequestRunner::RequestRunner(HostPlatform &platform) : m_platform(platform) {}
+RequestRunner::RequestRunner(HostPlatform &platform) : m_platform(platform)
+{}
 
 std::optional<ReplyCollector::Reply> RequestRunner::send(const HostRequest &request)
 {
@@ -49,8 +50,8 @@ void RequestRunner::run(const std::vector<HostRequest> &requests)
         const std::optional<ReplyCollector::Reply> reply = send(requests[i]);
         if (!reply) {
             if (i + 1 < requests.size())
-                printError(QStringLiteral("%1 later request(s) not sent")
-                               .arg(requests.size() - i - 1));
+                printError(
+                    QStringLiteral("%1 later request(s) not sent").arg(requests.size() - i - 1));
             return;
         }
         printLine(replyLine(requests[i].command, *reply));

@@ -56,7 +56,8 @@ QStringList weekGrid(const QString &content)
 
     std::map<QString, WeekMinutes> modes;
     QStringList notWeekly;
-    for (const QJsonValue &value : document.object().value(QStringLiteral("Rectangles")).toArray()) {
+    for (const QJsonValue &value :
+         document.object().value(QStringLiteral("Rectangles")).toArray()) {
         const QJsonObject rectangle = value.toObject();
         const QString mode = rectangle.value(QStringLiteral("RecordingMode")).toString();
         const int left = rectangle.value(QStringLiteral("Left")).toInt(-1);
