@@ -10,6 +10,25 @@
 
 #include <gtest/gtest.h>
 
+#include <ostream>
+
+// Readable failure messages for the Qt texts the tests compare.
+inline void PrintTo(const QString &text, std::ostream *os)
+{
+    *os << '"' << text.toStdString() << '"';
+}
+inline void PrintTo(const QByteArray &bytes, std::ostream *os)
+{
+    *os << '"' << bytes.toStdString() << '"';
+}
+inline void PrintTo(const QStringList &texts, std::ostream *os)
+{
+    *os << "{\n";
+    for (const QString &text : texts)
+        *os << "  \"" << text.toStdString() << "\"\n";
+    *os << '}';
+}
+
 // Runs the built plugin-host as a process of its own, against a server
 // database and an exchange log in a folder of the test's own.
 class HostProcess : public testing::Test

@@ -75,6 +75,7 @@ struct CommandCase
     const char *name;
     QString command;
     QByteArray payload; // empty: none
+    bool flag;          // true from the queries, the tunnel's flag (false) otherwise
     QByteArray data;    // the reply's data as printed
     QStringList exchanges;
     // The time cards after: the seeded ones with these lines replaced
@@ -120,9 +121,9 @@ TEST_P(Command, RepliesOnceAndChangesTheServerAsAsked)
     EXPECT_EQ(run.err, QByteArray());
     ASSERT_EQ(run.lines().size(), 1) << run.out.toStdString();
     EXPECT_EQ(run.lines().first(), "{\"command\": \"" + c.command.toUtf8() +
-                                       "\", \"flag\": false, \"code\": \"0\", \"text\": \"\", "
-                                       "\"data\": " +
-                                       c.data + "}");
+                                       "\", \"flag\": " + (c.flag ? "true" : "false") +
+                                       ", \"code\": \"0\", \"text\": \"\", \"data\": " + c.data +
+                                       "}");
     EXPECT_EQ(exchangeCommands(), c.exchanges);
     for (const QJsonObject &exchange : exchanges()) {
         EXPECT_EQ(exchange.value(QStringLiteral("outcome")).toString(), QStringLiteral("answered"));
@@ -143,12 +144,14 @@ INSTANTIATE_TEST_SUITE_P(
         CommandCase{"schedule_in_force_leaves_the_default_card_out",
                     QStringLiteral("GetScheduleRecInfo"),
                     {},
+                    true,
                     R"({"CustomizeContent":"","RecScheduleType":0})",
                     {Get},
                     {}},
         CommandCase{"current_schedule_counts_the_default_card",
                     QStringLiteral("GetCurrentScheduleInfo"),
                     {},
+                    true,
                     R"({"CustomizeContent":"","RecScheduleType":4})",
                     {Get},
                     {}},
@@ -162,6 +165,7 @@ INSTANTIATE_TEST_SUITE_P(
                     QStringLiteral("AddSchedule"),
                     payload({{QStringLiteral("ScheduleName"), QStringLiteral("Lobby")},
                              {QStringLiteral("timeframes"), QString::fromLatin1(Lobby)}}),
+                    false,
                     R"("8")",
                     {Ins},
                     {QStringLiteral("8 r1 Lobby []")}},
@@ -171,12 +175,14 @@ INSTANTIATE_TEST_SUITE_P(
                              {QStringLiteral("ScheduleName"), QStringLiteral("Office hours")},
                              {QStringLiteral("timeframes"), QString::fromLatin1(OfficeHours)},
                              {QStringLiteral("camRecGroupList"), QJsonArray{camera("C_9", "4")}}}),
+                    false,
                     "null",
                     {Get, Upd},
                     {QStringLiteral("7 r3 Office hours [C_9/4]")}},
         CommandCase{"delete_schedule_by_identifier",
                     QStringLiteral("DelSchedule"),
                     payload({{QStringLiteral("TimeCardID"), QStringLiteral("7")}}),
+                    false,
                     "null",
                     {Get, Del},
                     {QStringLiteral("-7")}},
@@ -198,12 +204,14 @@ INSTANTIATE_TEST_SUITE_P(
         CommandCase{"default_continuous_adds_before_the_cameras_it_had",
                     QStringLiteral("DefaultContinousSchedule"),
                     payload({{QStringLiteral("camRecGroupList"), QJsonArray{camera("C_7", "2")}}}),
+                    false,
                     "null",
                     {Get, Upd},
                     {QStringLiteral("2 r6 KOLT2 Default Continuous Recording [C_7/2 C_1/1]")}},
         CommandCase{"default_event_updates_the_existing_card",
                     QStringLiteral("DefaultEventSchedule"),
                     payload({{QStringLiteral("camRecGroupList"), QJsonArray{camera("C_8", "2")}}}),
+                    false,
                     "null",
                     {Get, Upd},
                     {QStringLiteral("3 r2 KOLT2 Default Event Recording [C_8/2]")}},
@@ -211,6 +219,7 @@ INSTANTIATE_TEST_SUITE_P(
                     QStringLiteral("CustomizeSchedule"),
                     payload({{QStringLiteral("timeframes"), QString::fromLatin1(Lobby)},
                              {QStringLiteral("camRecGroupList"), QJsonArray{camera("C_12", "3")}}}),
+                    false,
                     "null",
                     {Get, Ins},
                     {QStringLiteral("8 r1 KOLT2 Customize Recording [C_12/3]")}},
@@ -218,6 +227,7 @@ INSTANTIATE_TEST_SUITE_P(
                     QStringLiteral("DefaultNotRecordingSchedule"),
                     payload({{QStringLiteral("camRecGroupList"),
                               QJsonArray{camera("C_5", "1"), camera("C_1", "1")}}}),
+                    false,
                     "null",
                     {Get, Get, Upd, Get, Upd},
                     {QStringLiteral("1 r4 Default Schedule []"),
