@@ -158,6 +158,7 @@ INSTANTIATE_TEST_SUITE_P(
         CommandCase{"all_schedules_with_cameras_and_content",
                     QStringLiteral("GetAllScheduleRecInfo"),
                     {},
+                    true,
                     allSchedules(),
                     {Get},
                     {}},
@@ -197,6 +198,7 @@ INSTANTIATE_TEST_SUITE_P(
                       QJsonArray{QJsonObject{
                           {QStringLiteral("scheduleID"), QStringLiteral("7")},
                           {QStringLiteral("camIDList"), QJsonArray{camera("C_1", "1")}}}}}}),
+            false,
             "null",
             {Get, Upd, Get, Upd},
             {QStringLiteral("2 r6 KOLT2 Default Continuous Recording []"),
