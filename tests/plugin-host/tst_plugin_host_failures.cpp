@@ -6,7 +6,6 @@
 
 #include <QCoreApplication>
 #include <QFile>
-#include <QFileInfo>
 
 namespace {
 
@@ -105,61 +104,10 @@ INSTANTIATE_TEST_SUITE_P(
                   "--faults"}),
     [](const testing::TestParamInfo<UsageCase> &info) { return std::string(info.param.name); });
 
-class Fixed : public HostProcess
+class LateServer : public HostProcess
 {};
 
-TEST_F(Fixed, HelpAndVersionEndWithStatusZero)
-{
-    const Run help = bare({QStringLiteral("--help")});
-    EXPECT_EQ(help.status, 0);
-    EXPECT_TRUE(help.out.contains("request NAME [PAYLOAD]"));
-    EXPECT_TRUE(help.out.contains("--trace-level"));
-    const Run version = bare({QStringLiteral("--version")});
-    EXPECT_EQ(version.status, 0);
-    EXPECT_EQ(version.out, "plugin-host 1.0.0\n");
-}
-
-TEST_F(Fixed, DefaultDatabaseIsCreatedInTheUserDataLocation)
-{
-    const Run run = bare({QStringLiteral("dump")});
-    EXPECT_EQ(run.status, 0) << run.err.toStdString();
-    EXPECT_TRUE(
-        QFileInfo::exists(path(QStringLiteral("data-home/plugin-host/recording-server.sqlite"))));
-    // A fresh server holds its default time card.
-    EXPECT_EQ(cardLines(QString::fromUtf8(run.out)),
-              QStringList{QStringLiteral("1 r1 Default Schedule []")});
-}
-
-TEST_F(Fixed, SessionRepliesInOrderWithEachRequestersIdentity)
-{
-    seed();
-    const QByteArray session =
-        R"({"command": "AddSchedule", "payload": {"ScheduleName": "Hall", "timeframes": "{\"Rectangles\":[]}"}, "client": 5}
-
-{"command": "Nope", "client": 9}
-{"command": "GetScheduleRecInfo", "payload": [1, 2]}
-)";
-    const Run run =
-        host({QStringLiteral("--client"), QStringLiteral("4"), QStringLiteral("session")}, session);
-    EXPECT_EQ(run.status, 0) << run.err.toStdString();
-    ASSERT_EQ(run.lines().size(), 3) << run.out.toStdString();
-    EXPECT_EQ(run.lines().at(0),
-              R"({"command": "AddSchedule", "flag": false, "code": "0", "text": "", "data": "8"})");
-    EXPECT_EQ(run.lines().at(1),
-              R"({"command": "Nope", "flag": true, "code": "-1", "text": "", "data": null})");
-    EXPECT_EQ(
-        run.lines().at(2),
-        R"({"command": "GetScheduleRecInfo", "flag": false, "code": "0", "text": "", "data": {"CustomizeContent":"","RecScheduleType":0}})");
-    const QList<QJsonObject> sent = exchanges();
-    ASSERT_EQ(sent.size(), 2);
-    EXPECT_EQ(sent.at(0).value(QStringLiteral("command")).toString(),
-              QStringLiteral("InsRecTmcard"));
-    EXPECT_EQ(sent.at(0).value(QStringLiteral("identity")).toString(), QStringLiteral("0x5"));
-    EXPECT_EQ(sent.at(1).value(QStringLiteral("command")).toString(),
-              QStringLiteral("GetRecTmcard"));
-}
-
-TEST_F(Fixed, LateServerPastTheReplyTimeOutEndsWithStatusThree)
+TEST_F(LateServer, PastTheReplyTimeOutEndsWithStatusThree)
 {
     seed();
     const Run run =
@@ -173,7 +121,7 @@ TEST_F(Fixed, LateServerPastTheReplyTimeOutEndsWithStatusThree)
     EXPECT_TRUE(run.err.contains("1 later request(s) not sent")) << run.err.toStdString();
 }
 
-TEST_F(Fixed, LateServerPastTheRequestTimeOutGivesOneFailedReply)
+TEST_F(LateServer, PastTheRequestTimeOutGivesOneFailedReply)
 {
     seed();
     // The plug-in's reads wait 15 s; the answer comes 5 s after that.
@@ -190,7 +138,7 @@ TEST_F(Fixed, LateServerPastTheRequestTimeOutGivesOneFailedReply)
     EXPECT_FALSE(exchanges().first().value(QStringLiteral("ok")).toBool());
 }
 
-TEST_F(Fixed, RawExchangeWaitsAsLongAsTheReplyTimeOut)
+TEST_F(LateServer, RawExchangeWaitsAsLongAsTheReplyTimeOut)
 {
     seed();
     const QString read = QStringLiteral("<GetRecTmcard><TmcardID>3</TmcardID></GetRecTmcard>");

@@ -90,9 +90,11 @@ public:
     std::optional<ReplyCollector::Reply> step(const QString &command, const QVariantMap &payload)
     {
         HostRequest request{command, payload.isEmpty() ? QVariant() : QVariant(payload), {}};
-        printText(QStringLiteral("> %1 %2").arg(
-            command,
-            QString::fromUtf8(JsonValues::compact(QJsonValue::fromVariant(request.payload)))));
+        const QString shown =
+            request.payload.isValid()
+                ? QString::fromUtf8(JsonValues::compact(QJsonValue::fromVariant(request.payload)))
+                : QString();
+        printText(QStringLiteral("> %1 %2").arg(command, shown).trimmed());
         const std::optional<ReplyCollector::Reply> reply = m_runner.send(request);
         if (!reply) {
             m_failed = true;
