@@ -3,6 +3,7 @@
 
 #include "FakeControl.h"
 #include "PluginRecordingScheduleSettingSrv.h"
+#include "QtPrinters.h"
 #include "ReplyRecorder.h"
 #include "RequestSenderInfo.h"
 #include "TestLog.h"

@@ -5,6 +5,7 @@
 
 #include "FakeControl.h"
 #include "PluginRecordingScheduleSettingSrv.h"
+#include "QtPrinters.h"
 #include "ReplyRecorder.h"
 #include "RequestSenderInfo.h"
 
