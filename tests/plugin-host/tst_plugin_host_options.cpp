@@ -5,6 +5,7 @@
 #include "HostProcess.h"
 
 #include <QCoreApplication>
+#include <QFile>
 #include <QFileInfo>
 
 namespace {
@@ -117,6 +118,38 @@ TEST_F(Options, TraceLevelSendsTheRecordsToStandardError)
     EXPECT_EQ(errorsOnly.err, QByteArray());
     const Run silent = host({QStringLiteral("request"), QStringLiteral("Nope")});
     EXPECT_EQ(silent.err, QByteArray());
+}
+
+// The README's session example: its input and output appear in the README
+// exactly as the files here hold them, and the program prints that output.
+TEST_F(Options, ReadmeSessionPrintsWhatTheReadmeShows)
+{
+    seed();
+    const auto read = [](const QString &fileName) {
+        QFile file(fileName);
+        EXPECT_TRUE(file.open(QIODevice::ReadOnly)) << fileName.toStdString();
+        return file.readAll();
+    };
+    const QByteArray expected = read(dataFile(QStringLiteral("session.out")));
+    const Run run = host({QStringLiteral("session"), dataFile(QStringLiteral("session.jsonl"))});
+    EXPECT_EQ(run.status, 0) << run.err.toStdString();
+    EXPECT_EQ(run.out, expected);
+
+    const Run raw = host({QStringLiteral("raw"), QStringLiteral("GetRecTmcard"),
+                          QStringLiteral("<GetRecTmcard><TmcardID>8</TmcardID></GetRecTmcard>")});
+    EXPECT_EQ(raw.out,
+              R"({"ok": true, "code": "0", "content": "<GetRecTmcardRes></GetRecTmcardRes>"})"
+              "\n");
+
+    // The lead may fold this README into the top-level one: either counts.
+    const QByteArray readme = read(QStringLiteral(SOURCE_ROOT "/tools/plugin-host/README.md")) +
+                              read(QStringLiteral(SOURCE_ROOT "/README.md"));
+    for (const QByteArray &line :
+         read(dataFile(QStringLiteral("session.jsonl"))).split('\n') + expected.split('\n')) {
+        if (!line.isEmpty())
+            EXPECT_TRUE(readme.contains("    " + line + '\n')) << line.toStdString();
+    }
+    EXPECT_TRUE(readme.contains(raw.out.trimmed())) << raw.out.toStdString();
 }
 
 } // namespace

@@ -153,6 +153,8 @@ public:
             if (before == m_known.end() || before->second.content != schedule.content) {
                 for (const QString &line : weekGrid(schedule.content))
                     printText(QStringLiteral("    ") + line);
+            } else {
+                printText(QStringLiteral("    (time frames unchanged)"));
             }
         }
         for (const auto &[id, schedule] : m_known) {
