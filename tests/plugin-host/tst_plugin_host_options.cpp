@@ -146,8 +146,9 @@ TEST_F(Options, ReadmeSessionPrintsWhatTheReadmeShows)
                               read(QStringLiteral(SOURCE_ROOT "/README.md"));
     for (const QByteArray &line :
          read(dataFile(QStringLiteral("session.jsonl"))).split('\n') + expected.split('\n')) {
-        if (!line.isEmpty())
+        if (!line.isEmpty()) {
             EXPECT_TRUE(readme.contains("    " + line + '\n')) << line.toStdString();
+        }
     }
     EXPECT_TRUE(readme.contains(raw.out.trimmed())) << raw.out.toStdString();
 }
