@@ -11,6 +11,7 @@
 #include <QJsonArray>
 #include <QJsonDocument>
 
+#include <algorithm>
 #include <utility>
 #include <vector>
 
@@ -158,6 +159,14 @@ QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &
         const QString triggers =
             modeText == RecordingMode::Event ? ParseTriggerEvents(mapping) : QString();
 
+        // Grown ahead, doubling: a document of many event frames runs to tens
+        // of megabytes, and growing it rectangle by rectangle spends the time
+        // copying it.
+        const qsizetype perRectangle = 96 + mode.size() + triggers.size();
+        const qsizetype needed =
+            document.size() + qsizetype(runs.size() * intervals.size()) * perRectangle;
+        if (needed > document.capacity())
+            document.reserve(std::max(needed, 2 * document.capacity()));
         for (const auto &[left, right] : runs) {
             const QString leftText = QString::number(left);
             const QString rightText = QString::number(right);
