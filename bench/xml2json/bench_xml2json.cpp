@@ -99,12 +99,37 @@ void BM_Parse(benchmark::State &state)
 }
 BENCHMARK(BM_Parse)->Unit(benchmark::kMillisecond);
 
-void BM_Siblings(benchmark::State &state)
+QString siblings(qsizetype count)
 {
     QString xml = QStringLiteral("<CamList>");
-    for (int i = 0; i < state.range(0); ++i)
+    for (qsizetype i = 0; i < count; ++i)
         xml += QStringLiteral("<Cam>%1</Cam>").arg(i);
-    xml += QStringLiteral("</CamList>");
+    return xml + QStringLiteral("</CamList>");
+}
+
+void BM_SiblingsBareReader(benchmark::State &state)
+{
+    const QString xml = siblings(state.range(0));
+    for (auto _ : state) {
+        QXmlStreamReader reader(xml);
+        qsizetype seen = 0;
+        while (!reader.atEnd()) {
+            reader.readNext();
+            seen += reader.name().size() + reader.text().size();
+        }
+        benchmark::DoNotOptimize(seen);
+    }
+    state.SetComplexityN(state.range(0));
+}
+BENCHMARK(BM_SiblingsBareReader)
+    ->RangeMultiplier(10)
+    ->Range(1000, 1000000)
+    ->Complexity()
+    ->Unit(benchmark::kMillisecond);
+
+void BM_Siblings(benchmark::State &state)
+{
+    const QString xml = siblings(state.range(0));
     const XML2Json converter;
     for (auto _ : state) {
         QVariant tree = converter.parse(xml);
@@ -114,7 +139,7 @@ void BM_Siblings(benchmark::State &state)
 }
 BENCHMARK(BM_Siblings)
     ->RangeMultiplier(10)
-    ->Range(1000, 100000)
+    ->Range(1000, 1000000)
     ->Complexity()
     ->Unit(benchmark::kMillisecond);
 

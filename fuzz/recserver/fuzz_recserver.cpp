@@ -9,6 +9,7 @@
 #include <QXmlStreamReader>
 
 #include <cstdint>
+#include <cstdio>
 #include <cstdlib>
 #include <memory>
 
@@ -28,10 +29,13 @@ RecordingServer &server()
     return *instance;
 }
 
-void check(bool condition)
+void check(bool condition, const char *what, const ServerAnswer &answer = {})
 {
-    if (!condition)
-        std::abort();
+    if (condition)
+        return;
+    std::fprintf(stderr, "%s\ncode %s\n%s\n", what, qPrintable(answer.code),
+                 qPrintable(answer.content));
+    std::abort();
 }
 
 bool wellFormed(const QString &xml)
@@ -54,22 +58,22 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     QString before = recServer.dump();
     // Keep the state small: what the fuzzer inserted is not what it is after.
     if (before.size() > 200000) {
-        check(recServer.seed(QStringLiteral("<GetRecTmcardRes></GetRecTmcardRes>")));
+        check(recServer.seed(QStringLiteral("<GetRecTmcardRes></GetRecTmcardRes>")), "reset");
         before = recServer.dump();
     }
     const unsigned selector = data[0] % 6;
     if (selector == 5) {
         if (!recServer.seed(body))
-            check(recServer.dump() == before);
+            check(recServer.dump() == before, "refused seed changed the state");
         return 0;
     }
     const QString command = QString::fromLatin1(kCommands[selector]);
     const ServerAnswer answer = recServer.handle(command, body);
     bool numeric = false;
     answer.code.toInt(&numeric);
-    check(numeric);
-    check(wellFormed(answer.content));
+    check(numeric, "code not numeric", answer);
+    check(wellFormed(answer.content), "answer not well-formed", answer);
     if (answer.code != QLatin1String("0") || selector == 0)
-        check(recServer.dump() == before);
+        check(recServer.dump() == before, "refusal or read changed the state", answer);
     return 0;
 }

@@ -9,7 +9,8 @@ QString XmlOut::escaped(QStringView text)
 {
     QString result;
     result.reserve(text.size());
-    for (const QChar c : text) {
+    for (qsizetype i = 0; i < text.size(); ++i) {
+        const QChar c = text[i];
         switch (c.unicode()) {
         case '&':
             result += QLatin1String("&amp;");
@@ -30,8 +31,20 @@ QString XmlOut::escaped(QStringView text)
         case '\r':
             result += QLatin1String("&#13;");
             break;
-        default:
+        case '\t':
+        case '\n':
             result += c;
+            break;
+        default:
+            if (c.isHighSurrogate() && i + 1 < text.size() && text[i + 1].isLowSurrogate()) {
+                result += c;
+                result += text[++i];
+            } else if (c.unicode() < 0x20 || c.isSurrogate() || c.unicode() >= 0xFFFE) {
+                // Not a character XML can carry (a reason may quote raw input).
+                result += QChar(QChar::ReplacementCharacter);
+            } else {
+                result += c;
+            }
         }
     }
     return result;

@@ -49,10 +49,10 @@ QString FaultDecision::describe() const
     return parts.join(QLatin1Char(' '));
 }
 
-bool FaultPlan::parse(const QString &spec, QString *error)
+bool FaultPlan::parse(const QString &text, QString *error)
 {
     m_rules.clear();
-    for (const QString &item : spec.split(QLatin1Char(','), Qt::SkipEmptyParts)) {
+    for (const QString &item : text.split(QLatin1Char(','), Qt::SkipEmptyParts)) {
         if (!parseItem(item.trimmed(), error)) {
             m_rules.clear();
             return false;

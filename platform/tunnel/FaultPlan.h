@@ -31,7 +31,7 @@ class FaultPlan
 {
 public:
     // False with a reason when the specification does not parse.
-    bool parse(const QString &spec, QString *error);
+    bool parse(const QString &text, QString *error);
     void setSeed(quint64 seed) { m_random.seed(seed); }
     bool empty() const { return m_rules.empty(); }
 

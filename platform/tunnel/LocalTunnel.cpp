@@ -402,8 +402,8 @@ void LocalTunnel::waitIdle()
     });
 }
 
-bool LocalTunnel::checkFaults(const QString &spec, QString *error)
+bool LocalTunnel::checkFaults(const QString &text, QString *error)
 {
     FaultPlan plan;
-    return plan.parse(spec, error);
+    return plan.parse(text, error);
 }

@@ -4,6 +4,7 @@
 #include <QSqlDatabase>
 #include <QSqlQuery>
 #include <QVariant>
+#include <QXmlStreamReader>
 
 #include <cctype>
 
@@ -443,4 +444,24 @@ TEST_F(RecordingServerTest, OpenRefusesNewerSchemaAndForeignFiles)
     RecordingServer foreign(garbage);
     EXPECT_FALSE(foreign.open(&error));
     EXPECT_FALSE(error.isEmpty());
+}
+
+// A refusal may quote the client's raw input; characters XML cannot carry
+// would otherwise make the answer itself unreadable.
+TEST_F(RecordingServerTest, RefusalsQuotingRawInputAreStillWellFormed)
+{
+    const ServerAnswer answers[] = {
+        ask(QStringLiteral("Get\x01Rec\x1f"), QStringLiteral("<x/>")),
+        ask(QStringLiteral("InsRecTmcard"),
+            QStringLiteral("<InsRecTmcard><Tmcard><Name>a &am\x01; b")),
+        ask(QStringLiteral("GetRecTmcard"),
+            QStringLiteral("<GetRecTmcard><TmcardID>%1\x02</TmcardID>").arg(QChar(0xD800))),
+    };
+    for (const ServerAnswer &answer : answers) {
+        EXPECT_NE(answer.code, QStringLiteral("0"));
+        QXmlStreamReader reader(answer.content);
+        while (!reader.atEnd())
+            reader.readNext();
+        EXPECT_FALSE(reader.hasError()) << answer.content.toStdString();
+    }
 }

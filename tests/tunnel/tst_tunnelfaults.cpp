@@ -127,7 +127,7 @@ TEST(InjectedFaults, AreReproducibleFromTheSeed)
 
 struct SpecRow
 {
-    const char *spec;
+    const char *text;
     bool valid;
 };
 
@@ -137,12 +137,12 @@ class FaultSpecifications : public ::testing::TestWithParam<SpecRow>
 TEST_P(FaultSpecifications, AreCheckedBeforeUse)
 {
     QString error;
-    EXPECT_EQ(LocalTunnel::checkFaults(QString::fromUtf8(GetParam().spec), &error),
+    EXPECT_EQ(LocalTunnel::checkFaults(QString::fromUtf8(GetParam().text), &error),
               GetParam().valid)
         << error.toStdString();
     EXPECT_EQ(error.isEmpty(), GetParam().valid);
     LocalTunnelOptions options;
-    options.faults = QString::fromUtf8(GetParam().spec);
+    options.faults = QString::fromUtf8(GetParam().text);
     EchoBackend backend;
     const LocalTunnel tunnel(backend.factory(), options);
     EXPECT_EQ(tunnel.IsConnected(), GetParam().valid)
