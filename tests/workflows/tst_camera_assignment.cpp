@@ -199,15 +199,15 @@ TEST_P(FixedEntries, AddToTheFixedTimecardOrCreateItWhenMissing)
 
     h.request(Command, payload({}, {entry(row.scheduleId, {{"C_5", "1"}, {"C_5", "1"}})}));
 
-    const std::vector<Message> expected =
-        row.exists
-            ? std::vector<Message>{msg("GetRecTmcard", Expect::readAll()),
-                                   msg("GetRecTmcard", Expect::readOne(4)),
-                                   msg("UpdRecTmcard",
-                                       Expect::updateCameras(fixed, {{"C_1", "1"}, {"C_5", "1"}}))}
-            : std::vector<Message>{msg("GetRecTmcard", Expect::readAll()),
-                                   msg("InsRecTmcard", Expect::insert(row.timecardName, row.mapping,
-                                                                      {{"C_5", "1"}}))};
+    std::vector<Message> expected{msg("GetRecTmcard", Expect::readAll())};
+    if (row.exists) {
+        expected.push_back(msg("GetRecTmcard", Expect::readOne(4)));
+        expected.push_back(
+            msg("UpdRecTmcard", Expect::updateCameras(fixed, {{"C_1", "1"}, {"C_5", "1"}})));
+    } else {
+        expected.push_back(
+            msg("InsRecTmcard", Expect::insert(row.timecardName, row.mapping, {{"C_5", "1"}})));
+    }
     EXPECT_EQ(h.messages(), expected);
     ExpectOneReply(h.replies, false, "0");
     int named = 0;
