@@ -1,33 +1,197 @@
-// Placeholder: every operation refuses until the control lands.
 #include "RecordingSettingControl.h"
 
-RecordingSettingControl::RecordingSettingControl(IKoltTunnelClient *tunnel) : m_tunnel(tunnel) {}
-RecordingSettingControl::RecordingSettingControl(const RecordingSettingControl &other)
-    : IRecordingSettingControl(other), QEnableSharedFromThis<RecordingSettingControl>(other),
-      m_tunnel(other.m_tunnel), m_clientId(other.m_clientId.load())
+#include "RecordingScheduleSettingConstants.h"
+#include "TimecardTemplate.h"
+#include "TraceLog.h"
+
+#include <algorithm>
+#include <limits>
+
+using namespace PluginRecordingScheduleSettingCommon;
+
+namespace {
+
+constexpr int RequestKind = 1;
+
+bool accepted(bool ok, const QString &responseCode)
 {
+    return ok && responseCode == ResultCode::Success;
 }
+
+bool readable(const QVariant &tree)
+{
+    return tree.isValid() && !tree.isNull();
+}
+
+} // namespace
+
+RecordingSettingControl::RecordingSettingControl(IKoltTunnelClient *tunnel) : m_tunnel(tunnel)
+{}
+
+RecordingSettingControl::RecordingSettingControl(const RecordingSettingControl &other)
+    : IRecordingSettingControl(other)
+    , QEnableSharedFromThis<RecordingSettingControl>(other)
+    , m_tunnel(other.m_tunnel)
+    , m_clientId(other.m_clientId.load())
+{}
+
 RecordingSettingControl &RecordingSettingControl::operator=(const RecordingSettingControl &other)
 {
     m_tunnel = other.m_tunnel;
     m_clientId.store(other.m_clientId.load());
     return *this;
 }
+
 RecordingSettingControl::~RecordingSettingControl() = default;
-bool RecordingSettingControl::GetAllScheduleTimecardInfo(TimecardListCallback) { return false; }
-bool RecordingSettingControl::GetScheduleTimecardInfoById(int, TimecardListCallback) { return false; }
-bool RecordingSettingControl::RemoveTimecardCameraList(int, const QList<QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::CreateDefaultContinuousTimecard(const QList<QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::UpdateDefaultContinuousTimecard(const QMap<QString, QVariant> &, const QList<QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::CreateDefaultEventTimecard(const QList<QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::UpdateDefaultEventTimecard(const QMap<QString, QVariant> &, const QList<QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::CreateCustomizeTimecard(const QString &, const QList<QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::UpdateCustomizeTimecard(const QMap<QString, QVariant> &, const QString &, const QList<QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::AddSchedule(const QString &, const QString &, TimecardIdCallback) { return false; }
-bool RecordingSettingControl::UpdateSchedule(const QString &, const QString &, const QString &, const QString &, const QList<QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::DeleteSchedule(const QMap<QString, QVariant> &, ControlResultCallback) { return false; }
-bool RecordingSettingControl::UpdateTimecardCameraList(const QString &, const QList<QVariant> &, ControlResultCallback, int) { return false; }
-QMap<QString, QVariant> RecordingSettingControl::GetDefaultContinousTimecardInfo(const QList<QVariant> &) { return {}; }
-QMap<QString, QVariant> RecordingSettingControl::GetDefaultEventTimecardInfo(const QList<QVariant> &) { return {}; }
-QMap<QString, QVariant> RecordingSettingControl::GetCustomizeTimecardInfo(const QList<QVariant> &) { return {}; }
-void RecordingSettingControl::SetClientID(void *const clientId) { m_clientId.store(clientId); }
+
+void RecordingSettingControl::SetClientID(void *const clientId)
+{
+    m_clientId.store(clientId);
+}
+
+int RecordingSettingControl::CameraTimeout(qsizetype cameras)
+{
+    const qint64 perCamera = qint64(Timeout::PerCamera) * std::max<qsizetype>(cameras, 0);
+    return static_cast<int>(
+        std::clamp<qint64>(perCamera, Timeout::Minimum, std::numeric_limits<int>::max()));
+}
+
+bool RecordingSettingControl::Send(const QString &command, const QString &body, int timeoutMs,
+                                   Identity identity, TunnelResponseHandler handler)
+{
+    if (!m_tunnel)
+        return false;
+    TunnelRequest request;
+    request.flag = false;
+    request.timeoutMs = timeoutMs;
+    request.body = body;
+    // The request holds its control: an owner that replaces or releases the
+    // control while answers are on their way would otherwise leave the
+    // handler with a dangling control.
+    request.onResponse = [keepAlive = sharedFromThis(), handler = std::move(handler)](
+                             bool ok, const QString &status, const QString &detail,
+                             const QString &responseCode, const QString &content, bool flag) {
+        handler(ok, status, detail, responseCode, content, flag);
+    };
+    void *const clientId =
+        identity == Identity::Requester ? m_clientId.load() : m_tunnel->GetClientID();
+    return m_tunnel->SendRequest(PluginId, clientId, RequestKind, command, request);
+}
+
+TunnelResponseHandler RecordingSettingControl::BindResult(ControlResultCallback done)
+{
+    return [this, done = std::move(done)](bool ok, const QString &status, const QString &detail,
+                                          const QString &code, const QString &content, bool flag) {
+        HdlrTunnelReqCallback(ok, status, detail, code, content, flag, done);
+    };
+}
+
+TunnelResponseHandler RecordingSettingControl::BindTimecardList(TimecardListCallback done)
+{
+    return [this, done = std::move(done)](bool ok, const QString &status, const QString &detail,
+                                          const QString &code, const QString &content, bool flag) {
+        HdlrTunnelReqGetRecTimecard(ok, status, detail, code, content, flag, done);
+    };
+}
+
+TunnelResponseHandler RecordingSettingControl::BindTimecardId(TimecardIdCallback done)
+{
+    return [this, done = std::move(done)](bool ok, const QString &status, const QString &detail,
+                                          const QString &code, const QString &content, bool flag) {
+        HdlrAddScheduleCallback(ok, status, detail, code, content, flag, done);
+    };
+}
+
+bool RecordingSettingControl::GetAllScheduleTimecardInfo(TimecardListCallback done)
+{
+    return Send(TunnelCommand::GetRecTmcard, Template::GetAllTimecards, Timeout::Minimum,
+                Identity::Tunnel, BindTimecardList(std::move(done)));
+}
+
+bool RecordingSettingControl::GetScheduleTimecardInfoById(int timecardId, TimecardListCallback done)
+{
+    const QString body =
+        TimecardTemplate::filled(Template::GetTimecardById, {QString::number(timecardId)});
+    return Send(TunnelCommand::GetRecTmcard, body, Timeout::Minimum, Identity::Tunnel,
+                BindTimecardList(std::move(done)));
+}
+
+void RecordingSettingControl::HdlrTunnelReqGetRecTimecard(bool ok, const QString &, const QString &,
+                                                          const QString &responseCode,
+                                                          const QString &content, bool flag,
+                                                          TimecardListCallback done)
+{
+    if (!done)
+        return;
+    if (accepted(ok, responseCode)) {
+        const QVariant tree = m_converter.parse(content);
+        if (readable(tree)) {
+            const QVariant timecards =
+                tree.toMap().value(TimecardKey::GetRecTmcardRes).toMap().value(TimecardKey::Tmcard);
+            done(true, flag, TransContentAsList(timecards), content);
+            return;
+        }
+        TRACE_ERROR("%s, parse Get Recording Timecard failed.",
+                    "RecordingSettingControl::HdlrTunnelReqGetRecTimecard");
+        done(false, flag, {}, QString());
+        return;
+    }
+    TRACE_ERROR("%s, HdlrTunnelReqGetRecTimecard failed: success:%d, reqRespCode:%s",
+                "RecordingSettingControl::HdlrTunnelReqGetRecTimecard", ok ? 1 : 0,
+                responseCode.toLocal8Bit().constData());
+    done(false, flag, {}, QString());
+}
+
+void RecordingSettingControl::HdlrAddScheduleCallback(bool ok, const QString &, const QString &,
+                                                      const QString &responseCode,
+                                                      const QString &content, bool flag,
+                                                      TimecardIdCallback done)
+{
+    if (!done)
+        return;
+    if (accepted(ok, responseCode)) {
+        const QVariant tree = m_converter.parse(content);
+        if (readable(tree)) {
+            done(true, flag,
+                 tree.toMap()
+                     .value(TimecardKey::InsRecTmcardRes)
+                     .toMap()
+                     .value(TimecardKey::TmcardID)
+                     .toString());
+            return;
+        }
+        TRACE_ERROR("%s, parse InsRecTmcardRes failed.",
+                    "RecordingSettingControl::HdlrAddScheduleCallback");
+        done(false, flag, QString());
+        return;
+    }
+    TRACE_ERROR("%s, HdlrAddScheduleCallback failed: success:%d, reqRespCode:%s",
+                "RecordingSettingControl::HdlrAddScheduleCallback", ok ? 1 : 0,
+                responseCode.toLocal8Bit().constData());
+    done(false, flag, QString());
+}
+
+void RecordingSettingControl::HdlrTunnelReqCallback(bool ok, const QString &, const QString &,
+                                                    const QString &responseCode, const QString &,
+                                                    bool flag, ControlResultCallback done)
+{
+    if (!done)
+        return;
+    if (accepted(ok, responseCode)) {
+        done(true, flag);
+        return;
+    }
+    TRACE_ERROR("%s, HdlrTunnelReqCallback failed: success:%d, reqRespCode:%s",
+                "RecordingSettingControl::HdlrTunnelReqCallback", ok ? 1 : 0,
+                responseCode.toLocal8Bit().constData());
+    done(false, flag);
+}
+
+QList<QVariant> RecordingSettingControl::TransContentAsList(const QVariant &content)
+{
+    if (!readable(content))
+        return {};
+    if (content.typeId() == QMetaType::QVariantList)
+        return content.toList();
+    return {content};
+}

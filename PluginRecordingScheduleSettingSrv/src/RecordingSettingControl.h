@@ -5,8 +5,10 @@
 #include "XML2Json.h"
 
 #include <QEnableSharedFromThis>
+#include <QSet>
 
 #include <atomic>
+#include <optional>
 
 // The server-facing half of the plug-in: composes the time card messages,
 // sends them through the tunnel and reads the answers. Operations run on the
@@ -43,8 +45,7 @@ public:
     bool UpdateCustomizeTimecard(const QMap<QString, QVariant> &summary, const QString &content,
                                  const QList<QVariant> &cameras,
                                  ControlResultCallback done) override;
-    bool AddSchedule(const QString &name, const QString &content,
-                     TimecardIdCallback done) override;
+    bool AddSchedule(const QString &name, const QString &content, TimecardIdCallback done) override;
     bool UpdateSchedule(const QString &revision, const QString &timecardId, const QString &name,
                         const QString &content, const QList<QVariant> &cameras,
                         ControlResultCallback done) override;
@@ -52,7 +53,8 @@ public:
                         ControlResultCallback done) override;
     bool UpdateTimecardCameraList(const QString &answer, const QList<QVariant> &cameras,
                                   ControlResultCallback done, int timeoutMs) override;
-    QMap<QString, QVariant> GetDefaultContinousTimecardInfo(const QList<QVariant> &timecards) override;
+    QMap<QString, QVariant>
+    GetDefaultContinousTimecardInfo(const QList<QVariant> &timecards) override;
     QMap<QString, QVariant> GetDefaultEventTimecardInfo(const QList<QVariant> &timecards) override;
     QMap<QString, QVariant> GetCustomizeTimecardInfo(const QList<QVariant> &timecards) override;
     void SetClientID(void *const clientId) override;
@@ -66,14 +68,20 @@ private:
     // The common send path: one request with the given body and answer handler.
     bool Send(const QString &command, const QString &body, int timeoutMs, Identity identity,
               TunnelResponseHandler handler);
+    // The answer handlers bound to this control and to the caller's completion.
+    TunnelResponseHandler BindResult(ControlResultCallback done);
+    TunnelResponseHandler BindTimecardList(TimecardListCallback done);
+    TunnelResponseHandler BindTimecardId(TimecardIdCallback done);
+    // 2000 ms per camera, never below 15000.
+    static int CameraTimeout(qsizetype cameras);
 
     // Answer handlers (the six tunnel values, then the caller's completion).
     void HdlrTunnelReqCallback(bool ok, const QString &status, const QString &detail,
                                const QString &responseCode, const QString &content, bool flag,
                                ControlResultCallback done);
     void HdlrTunnelReqGetRecTimecard(bool ok, const QString &status, const QString &detail,
-                                     const QString &responseCode, const QString &content,
-                                     bool flag, TimecardListCallback done);
+                                     const QString &responseCode, const QString &content, bool flag,
+                                     TimecardListCallback done);
     void HdlrAddScheduleCallback(bool ok, const QString &status, const QString &detail,
                                  const QString &responseCode, const QString &content, bool flag,
                                  TimecardIdCallback done);
@@ -91,9 +99,20 @@ private:
     QString ComposeIntervalMsg(double beginHours, double endHours) const;
     QString ComposeCamRecGrpListMsg(const QList<QVariant> &cameras) const;
 
+    // Sends a fixed time card: the summary's revision and identifier, its
+    // cameras merged after the given ones.
+    bool UpdateFixedTimecard(const QMap<QString, QVariant> &summary, const QString &name,
+                             const QString &mapping, const QList<QVariant> &cameras,
+                             ControlResultCallback done);
+    bool InsertFixedTimecard(const QString &name, const QString &mapping,
+                             const QList<QVariant> &cameras, int timeoutMs,
+                             ControlResultCallback done);
     QMap<QString, QVariant> GetTimecardInfoByName(const QList<QVariant> &timecards,
                                                   const QString &name) const;
-    QString RemoveCamera(QString cameraListText, const QList<QVariant> &removal) const;
+    // The kept cameras of a "<CamList>" element, written for an update; empty
+    // when none is kept; nothing when the list cannot be read.
+    std::optional<QString> RemoveCamera(const QString &cameraListText,
+                                        const QSet<QString> &removal) const;
 
     IKoltTunnelClient *m_tunnel;
     XML2Json m_converter;

@@ -1,0 +1,266 @@
+// Time cards into the client's schedule content document and the summary of
+// the schedule in force. Pure: reads only its arguments, runs on whichever
+// thread delivers the control's completion.
+
+#include "PluginRecordingScheduleSettingSrv.h"
+
+#include "RecordingScheduleSettingConstants.h"
+#include "RecordingScheduleType.h"
+#include "TimecardReadings.h"
+
+#include <QJsonArray>
+#include <QJsonDocument>
+
+#include <utility>
+#include <vector>
+
+using namespace PluginRecordingScheduleSettingCommon;
+using namespace TimecardReadings;
+
+namespace {
+
+struct TriggerKey
+{
+    QLatin1String documentKey; // with its leading comma and trailing colon
+    QString element;
+};
+
+// Rows of the trigger event object that are always written, in order.
+const std::vector<TriggerKey> &alwaysWritten()
+{
+    static const std::vector<TriggerKey> keys{
+        {QLatin1String("\"motion\":"), QStringLiteral("Motion")},
+        {QLatin1String(",\"pir\":"), QStringLiteral("PIR")},
+        {QLatin1String(",\"tampering\":"), QStringLiteral("Tampering")},
+        {QLatin1String(",\"pptz\":"), QStringLiteral("PPTZTrigger")},
+        {QLatin1String(",\"lineDetection\":"), QStringLiteral("LineDetection")},
+        {QLatin1String(",\"fieldDetection\":"), QStringLiteral("FieldDetection")},
+        {QLatin1String(",\"loitering\":"), QStringLiteral("Loitering")},
+        {QLatin1String(",\"crowdDetection\":"), QStringLiteral("CrowdDetection")},
+        {QLatin1String(",\"missingObject\":"), QStringLiteral("MissingObject")},
+        {QLatin1String(",\"abandonObject\":"), QStringLiteral("AbandonObject")},
+        {QLatin1String(",\"faceDetection\":"), QStringLiteral("FaceDetection")},
+    };
+    return keys;
+}
+
+// Rows written only when the time card holds the element: servers that do
+// not know an analytic leave it out, and so does the document.
+const std::vector<TriggerKey> &writtenWhenPresent()
+{
+    static const std::vector<TriggerKey> keys{
+        {QLatin1String(",\"zoneDetection\":"), QStringLiteral("ZoneDetection")},
+        {QLatin1String(",\"smartTracking\":"), QStringLiteral("SmartTracking")},
+        {QLatin1String(",\"runningDetection\":"), QStringLiteral("RunningDetection")},
+        {QLatin1String(",\"parkingViolationDetection\":"),
+         QStringLiteral("ParkingViolationDetection")},
+        {QLatin1String(",\"restrictedZoneDetection\":"), QStringLiteral("RestrictedZoneDetection")},
+        {QLatin1String(",\"temperatureThresholdWarning\":"),
+         QStringLiteral("TemperatureThresholdWarning")},
+        {QLatin1String(",\"temperatureThresholdAlarm\":"),
+         QStringLiteral("TemperatureThresholdAlarm")},
+        {QLatin1String(",\"temperatureDifferenceWarning\":"),
+         QStringLiteral("TemperatureDifferenceWarning")},
+        {QLatin1String(",\"temperatureDifferenceAlarm\":"),
+         QStringLiteral("TemperatureDifferenceAlarm")},
+        {QLatin1String(",\"temperatureRiseWarning\":"), QStringLiteral("TemperatureRiseWarning")},
+        {QLatin1String(",\"temperatureRiseAlarm\":"), QStringLiteral("TemperatureRiseAlarm")},
+        {QLatin1String(",\"temperatureSectionAlarm\":"), QStringLiteral("TemperatureSectionAlarm")},
+        {QLatin1String(",\"thermalIntrusion\":"), QStringLiteral("ThermalIntrusion")},
+        {QLatin1String(",\"thermalMultiLoitering\":"), QStringLiteral("ThermalMultiLoitering")},
+        {QLatin1String(",\"fireSpotDetection\":"), QStringLiteral("FireSpotDetection")},
+        {QLatin1String(",\"smokerDetection\":"), QStringLiteral("SmokerDetection")},
+        {QLatin1String(",\"smokeAndFlameDetection\":"), QStringLiteral("SmokeAndFlameDetection")},
+    };
+    return keys;
+}
+
+QLatin1String boolText(bool value)
+{
+    return value ? QLatin1String("true") : QLatin1String("false");
+}
+
+QString hoursText(double seconds)
+{
+    return QString::number(seconds / 3600.0, 'g', 6);
+}
+
+bool needsEscaping(const QString &text)
+{
+    for (const QChar c : text) {
+        if (c.unicode() < 0x20 || c == QLatin1Char('"') || c == QLatin1Char('\\') ||
+            c.isSurrogate())
+            return true;
+    }
+    return false;
+}
+
+// The mode as a JSON string with its quotes. Escaped: a mode holding '"',
+// '\' or a control character would otherwise end the string early or make
+// the whole document unreadable. The modes in use come out unchanged.
+QString quotedMode(const QString &mode)
+{
+    if (!needsEscaping(mode))
+        return QLatin1Char('"') + mode + QLatin1Char('"');
+    const QByteArray array = QJsonDocument(QJsonArray{mode}).toJson(QJsonDocument::Compact);
+    // "[" + the string + "]"
+    return QString::fromUtf8(array.mid(1, array.size() - 2));
+}
+
+// Day runs of a frame as (Left, Right): only a day exactly one more than the
+// one before extends a run. Kept in 64 bits so that saturated day numbers at
+// the ends of int still give their neighbours without overflow.
+std::vector<std::pair<qint64, qint64>> dayRuns(const QVariant &days)
+{
+    std::vector<std::pair<qint64, qint64>> runs;
+    bool open = false;
+    qint64 start = 0;
+    qint64 last = 0;
+    for (const QVariant &entry : entries(days)) {
+        const qint64 day = dayNumber(entry.toMap().value(TimecardKey::AttrBegin));
+        if (open && day == last + 1) {
+            last = day;
+            continue;
+        }
+        if (open)
+            runs.emplace_back(start, last);
+        start = day - 1;
+        last = day;
+        open = true;
+    }
+    if (open)
+        runs.emplace_back(start, last);
+    return runs;
+}
+
+} // namespace
+
+QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &mappings) const
+{
+    static const QLatin1String bottomKey("{\"Bottom\":");
+    static const QLatin1String leftKey(",\"Left\":");
+    static const QLatin1String modeKey(",\"RecordingMode\":");
+    static const QLatin1String rightKey(",\"Right\":");
+    static const QLatin1String topKey(",\"Top\":");
+
+    QString document = QStringLiteral("{\"Rectangles\":[");
+    for (const QVariant &entry : mappings) {
+        const VariantMap mapping = entry.toMap();
+        const QString mode = quotedMode(text(mapping.value(TimecardKey::RecMode)));
+        const VariantMap frame = mapping.value(TimecardKey::Frame).toMap();
+
+        if (text(frame.value(TimecardKey::RepeatMod)) != TimecardKey::Weekly) {
+            document += QLatin1String("{\"Bottom\":-1,\"Left\":-1,\"RecordingMode\":") + mode +
+                        QLatin1String(",\"Right\":-1,\"Top\":-1},");
+            continue;
+        }
+
+        const auto runs =
+            dayRuns(frame.value(TimecardKey::DayList).toMap().value(TimecardKey::Ele));
+        std::vector<std::pair<QString, QString>> intervals; // (Top, Bottom) texts
+        for (const QVariant &interval :
+             entries(frame.value(TimecardKey::Intervals).toMap().value(TimecardKey::Ele))) {
+            const VariantMap bounds = interval.toMap();
+            intervals.emplace_back(hoursText(number(bounds.value(TimecardKey::AttrBegin))),
+                                   hoursText(number(bounds.value(TimecardKey::AttrEnd))));
+        }
+        const QString triggers = text(mapping.value(TimecardKey::RecMode)) == RecordingMode::Event
+                                     ? ParseTriggerEvents(mapping)
+                                     : QString();
+
+        for (const auto &[left, right] : runs) {
+            const QString leftText = QString::number(left);
+            const QString rightText = QString::number(right);
+            for (const auto &[top, bottom] : intervals) {
+                document += bottomKey;
+                document += bottom;
+                document += leftKey;
+                document += leftText;
+                document += modeKey;
+                document += mode;
+                document += rightKey;
+                document += rightText;
+                document += topKey;
+                document += top;
+                document += triggers;
+                document += QLatin1String("},");
+            }
+        }
+    }
+    if (document.endsWith(QLatin1Char(',')))
+        document.chop(1);
+    document += QLatin1String("]}");
+    return document;
+}
+
+QString PluginRecordingScheduleSettingSrv::ParseTriggerEvents(const VariantMap &mapping) const
+{
+    const int digitalInput = integer(mapping.value(TimecardKey::DigiInput));
+    const bool falling = flag(mapping.value(TimecardKey::StopUntilDIFalling));
+    const bool rising = flag(mapping.value(TimecardKey::StopUntilDIRising));
+
+    QString triggers = QStringLiteral(",\"triggerEvents\":{");
+    for (const TriggerKey &key : alwaysWritten()) {
+        triggers += key.documentKey;
+        triggers += boolText(flag(mapping.value(key.element)));
+    }
+    for (const TriggerKey &key : writtenWhenPresent()) {
+        const auto found = mapping.constFind(key.element);
+        if (found == mapping.constEnd())
+            continue;
+        triggers += key.documentKey;
+        triggers += boolText(flag(*found));
+    }
+    triggers += QLatin1String(",\"di\":");
+    triggers += boolText(digitalInput >= 1 || falling || rising);
+    triggers += ParseDITraditionalRec(digitalInput);
+    triggers += QLatin1String(",\"activatedToNormal\":");
+    triggers += boolText(falling);
+    triggers += QLatin1String(",\"normalToActivated\":");
+    triggers += boolText(rising);
+    triggers += QLatin1Char('}');
+    return triggers;
+}
+
+QString PluginRecordingScheduleSettingSrv::ParseDITraditionalRec(int mode) const
+{
+    return QLatin1String(",\"traditional\":") + boolText(mode >= 1) +
+           QLatin1String(",\"recordingStateTrigger\":") + boolText(mode == 1 || mode == 3) +
+           QLatin1String(",\"recordingStateNormal\":") + boolText(mode == 2 || mode == 3);
+}
+
+QString PluginRecordingScheduleSettingSrv::GetCustomizeSchedule(const VariantMap &timecard) const
+{
+    return ParseSchedule(
+        entries(timecard.value(TimecardKey::Mapping).toMap().value(TimecardKey::Ele)));
+}
+
+PluginRecordingScheduleSettingSrv::VariantMap
+PluginRecordingScheduleSettingSrv::ParseScheduleTimecard(const QList<QVariant> &timecards,
+                                                         const QList<int> &timecardIds) const
+{
+    RecordingScheduleType type = Other;
+    QString content;
+    if (timecardIds.isEmpty()) {
+        type = NoSchedule;
+    } else if (timecardIds.size() == 1) {
+        const int wanted = timecardIds.constFirst();
+        for (const QVariant &entry : timecards) {
+            const VariantMap timecard = entry.toMap();
+            if (integer(timecard.value(TimecardKey::TmcardID)) != wanted)
+                continue;
+            const QString name = text(timecard.value(TimecardKey::Name));
+            if (name == TimecardName::Customize) {
+                type = Customized;
+                content = GetCustomizeSchedule(timecard);
+            } else if (name == TimecardName::DefaultContinuous) {
+                type = DefaultContinuous;
+            } else if (name == TimecardName::DefaultEvent) {
+                type = DefaultEvent;
+            }
+            break;
+        }
+    }
+    return {{PayloadKey::RecScheduleType, QVariant(static_cast<int>(type))},
+            {PayloadKey::CustomizeContent, QVariant(content)}};
+}

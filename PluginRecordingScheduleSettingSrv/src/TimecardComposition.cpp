@@ -1,0 +1,220 @@
+// Turning what a client sends into the fragments of a time card: the schedule
+// content document into Mapping elements, a camera list into a CamList
+// element. Pure text work on the caller's thread; nothing is sent from here.
+#include "RecordingSettingControl.h"
+
+#include "RecordingScheduleSettingConstants.h"
+#include "TimecardTemplate.h"
+#include "TraceLog.h"
+
+#include <QJsonArray>
+#include <QJsonDocument>
+#include <QJsonObject>
+#include <QXmlStreamWriter>
+
+#include <algorithm>
+#include <cmath>
+#include <limits>
+
+using namespace PluginRecordingScheduleSettingCommon;
+
+namespace {
+
+// The trigger elements of a composed event time frame in the order the
+// server expects them, with the key of the document's trigger event object
+// that each reflects. "ContMotNum" and "DigiInput" are not plain flags.
+struct TriggerElement
+{
+    QLatin1String element;
+    QLatin1String key;
+};
+
+const QLatin1String ContMotNum("ContMotNum");
+const QLatin1String DigiInput("DigiInput");
+
+const TriggerElement TriggerElements[] = {
+    {QLatin1String("Motion"), QLatin1String("motion")},
+    {ContMotNum, QLatin1String()},
+    {DigiInput, QLatin1String()},
+    {QLatin1String("PIR"), QLatin1String("pir")},
+    {QLatin1String("Tampering"), QLatin1String("tampering")},
+    {QLatin1String("PPTZTrigger"), QLatin1String("pptz")},
+    {QLatin1String("StopUntilDIFalling"), QLatin1String("activatedToNormal")},
+    {QLatin1String("StopUntilDIRising"), QLatin1String("normalToActivated")},
+    {QLatin1String("LineDetection"), QLatin1String("lineDetection")},
+    {QLatin1String("FieldDetection"), QLatin1String("fieldDetection")},
+    {QLatin1String("Loitering"), QLatin1String("loitering")},
+    {QLatin1String("CrowdDetection"), QLatin1String("crowdDetection")},
+    {QLatin1String("MissingObject"), QLatin1String("missingObject")},
+    {QLatin1String("AbandonObject"), QLatin1String("abandonObject")},
+    {QLatin1String("FaceDetection"), QLatin1String("faceDetection")},
+    {QLatin1String("ZoneDetection"), QLatin1String("zoneDetection")},
+    {QLatin1String("SmartTracking"), QLatin1String("smartTracking")},
+    {QLatin1String("RunningDetection"), QLatin1String("runningDetection")},
+    {QLatin1String("ParkingViolationDetection"), QLatin1String("parkingViolationDetection")},
+    {QLatin1String("RestrictedZoneDetection"), QLatin1String("restrictedZoneDetection")},
+    {QLatin1String("TemperatureThresholdWarning"), QLatin1String("temperatureThresholdWarning")},
+    {QLatin1String("TemperatureThresholdAlarm"), QLatin1String("temperatureThresholdAlarm")},
+    {QLatin1String("TemperatureDifferenceWarning"), QLatin1String("temperatureDifferenceWarning")},
+    {QLatin1String("TemperatureDifferenceAlarm"), QLatin1String("temperatureDifferenceAlarm")},
+    {QLatin1String("TemperatureRiseWarning"), QLatin1String("temperatureRiseWarning")},
+    {QLatin1String("TemperatureRiseAlarm"), QLatin1String("temperatureRiseAlarm")},
+    {QLatin1String("TemperatureSectionAlarm"), QLatin1String("temperatureSectionAlarm")},
+    {QLatin1String("ThermalIntrusion"), QLatin1String("thermalIntrusion")},
+    {QLatin1String("ThermalMultiLoitering"), QLatin1String("thermalMultiLoitering")},
+    {QLatin1String("FireSpotDetection"), QLatin1String("fireSpotDetection")},
+    {QLatin1String("SmokerDetection"), QLatin1String("smokerDetection")},
+    {QLatin1String("SmokeAndFlameDetection"), QLatin1String("smokeAndFlameDetection")},
+};
+
+const QString DigitalInputKey = QStringLiteral("di");
+const QString TraditionalKey = QStringLiteral("traditional");
+const QString RecordingStateTriggerKey = QStringLiteral("recordingStateTrigger");
+const QString RecordingStateNormalKey = QStringLiteral("recordingStateNormal");
+
+constexpr int FirstDay = 1;
+constexpr int LastDay = 7;
+constexpr double SecondsPerHour = 3600.0;
+
+// Saturated: a cast of NaN or of a value beyond the int range is undefined.
+int saturatedInt(double value)
+{
+    if (std::isnan(value))
+        return 0;
+    if (value >= double(std::numeric_limits<int>::max()))
+        return std::numeric_limits<int>::max();
+    if (value <= double(std::numeric_limits<int>::min()))
+        return std::numeric_limits<int>::min();
+    return static_cast<int>(std::round(value));
+}
+
+// A document value read as an integer: numbers round to the nearest, as
+// the variant's own reading does, but saturate instead of wrapping.
+int integerOf(const QJsonValue &value)
+{
+    const QVariant variant = value.toVariant();
+    switch (variant.typeId()) {
+    case QMetaType::Double:
+    case QMetaType::Float:
+        return saturatedInt(variant.toDouble());
+    default: {
+        const qlonglong number = variant.toLongLong();
+        return static_cast<int>(std::clamp<qlonglong>(number, std::numeric_limits<int>::min(),
+                                                      std::numeric_limits<int>::max()));
+    }
+    }
+}
+
+double numberOf(const QJsonValue &value)
+{
+    return value.toVariant().toDouble();
+}
+
+} // namespace
+
+QString RecordingSettingControl::ComposeScheRecTimeframeMsg(const QString &content) const
+{
+    const QJsonDocument document = QJsonDocument::fromJson(content.toUtf8());
+    if (document.isNull() || !document.isObject()) {
+        TRACE_ERROR("Time frames parse error. %s", content.toLocal8Bit().constData());
+        return {};
+    }
+    const QJsonValue rectangles = document.object().value(DocKey::Rectangles);
+    if (!rectangles.isArray())
+        return {};
+
+    QString mapping;
+    QString frame;
+    QString days;
+    QString interval;
+    for (const QJsonValue &entry : rectangles.toArray()) {
+        const QJsonObject rectangle = entry.toObject();
+        frame.clear();
+        days = ComposeDayListMsg(integerOf(rectangle.value(DocKey::Left)),
+                                 integerOf(rectangle.value(DocKey::Right)));
+        interval = ComposeIntervalMsg(numberOf(rectangle.value(DocKey::Top)),
+                                      numberOf(rectangle.value(DocKey::Bottom)));
+        TimecardTemplate::appendFilled(frame, Template::Frame,
+                                       {Template::CustomizeFrameName, days, interval});
+        const QString mode = rectangle.value(DocKey::RecordingMode).toVariant().toString();
+        const QString triggers =
+            mode == RecordingMode::Event
+                ? ComposeTriggerEventsMsg(
+                      rectangle.value(DocKey::TriggerEvents).toObject().toVariantMap())
+                : QString();
+        // Escaped: a mode with '<' would otherwise end the element.
+        TimecardTemplate::appendFilled(mapping, Template::MappingElement,
+                                       {frame, TimecardTemplate::escaped(mode), triggers});
+    }
+    return mapping;
+}
+
+QString
+RecordingSettingControl::ComposeTriggerEventsMsg(const QMap<QString, QVariant> &triggers) const
+{
+    if (triggers.isEmpty()) {
+        TRACE_ERROR("trigget events map is empty");
+        return {};
+    }
+    QString text;
+    QXmlStreamWriter writer(&text);
+    writer.setAutoFormatting(false);
+    for (const TriggerElement &row : TriggerElements) {
+        if (row.element == ContMotNum)
+            writer.writeTextElement(row.element, QStringLiteral("1"));
+        else if (row.element == DigiInput)
+            writer.writeTextElement(row.element, GetDITraditionalRecMode(triggers));
+        else
+            writer.writeTextElement(row.element, triggers.value(row.key).toBool()
+                                                     ? QStringLiteral("1")
+                                                     : QStringLiteral("0"));
+    }
+    return text;
+}
+
+QString
+RecordingSettingControl::GetDITraditionalRecMode(const QMap<QString, QVariant> &triggers) const
+{
+    if (!triggers.value(DigitalInputKey).toBool() || !triggers.value(TraditionalKey).toBool())
+        return QStringLiteral("0");
+    const bool onTrigger = triggers.value(RecordingStateTriggerKey).toBool();
+    const bool onNormal = triggers.value(RecordingStateNormalKey).toBool();
+    return QString::number((onTrigger ? 1 : 0) | (onNormal ? 2 : 0));
+}
+
+QString RecordingSettingControl::ComposeDayListMsg(int first, int last) const
+{
+    // Only the grid's seven columns: a client's Right of 2000000000 would
+    // otherwise build gigabytes of day entries.
+    const qint64 from = std::max<qint64>(qint64(first) + 1, FirstDay);
+    const qint64 to = std::min<qint64>(last, LastDay);
+    QString days;
+    for (qint64 day = from; day <= to; ++day)
+        TimecardTemplate::appendFilled(days, Template::DayEntry, {QString::number(day)});
+    return days;
+}
+
+QString RecordingSettingControl::ComposeIntervalMsg(double beginHours, double endHours) const
+{
+    // Rounded to the nearest second: the document's hours carry six
+    // significant digits, and truncation would move 00:20:00 to 00:19:59 on
+    // every read and save.
+    return TimecardTemplate::filled(Template::IntervalEntry,
+                                    {QString::number(saturatedInt(beginHours * SecondsPerHour)),
+                                     QString::number(saturatedInt(endHours * SecondsPerHour))});
+}
+
+QString RecordingSettingControl::ComposeCamRecGrpListMsg(const QList<QVariant> &cameras) const
+{
+    if (cameras.isEmpty())
+        return {};
+    QString entries;
+    for (const QVariant &camera : cameras) {
+        const QMap<QString, QVariant> entry = camera.toMap();
+        TimecardTemplate::appendFilled(
+            entries, Template::Camera,
+            {TimecardTemplate::escaped(entry.value(TimecardKey::Name).toString()),
+             TimecardTemplate::escaped(entry.value(TimecardKey::GrpID).toString())});
+    }
+    return TimecardTemplate::filled(Template::CameraList, {entries});
+}

@@ -1,0 +1,103 @@
+// Answers that arrive after the plug-in object is gone. The host may delete
+// the plug-in while the tunnel still holds answers; each of those requests is
+// answered (true, "-1") by its completion, once, and nothing touches the
+// deleted object.
+
+#include "FakeControl.h"
+#include "PluginRecordingScheduleSettingSrv.h"
+#include "QtPrinters.h"
+#include "ReplyRecorder.h"
+#include "RequestSenderInfo.h"
+
+#include <gtest/gtest.h>
+
+#include <deque>
+#include <memory>
+#include <thread>
+
+namespace {
+
+const QStringList ReadFirstCommands{
+    QStringLiteral("DefaultContinousSchedule"),    QStringLiteral("DefaultEventSchedule"),
+    QStringLiteral("DefaultNotRecordingSchedule"), QStringLiteral("CustomizeSchedule"),
+    QStringLiteral("GetScheduleRecInfo"),          QStringLiteral("GetCurrentScheduleInfo"),
+    QStringLiteral("GetAllScheduleRecInfo"),       QStringLiteral("DelSchedule"),
+};
+
+TEST(PluginLifetime, AnswersHeldPastDeletionAreEachAnsweredOnce)
+{
+    const auto control = QSharedPointer<FakeControl>::create();
+    control->setFetch(FakeControl::Fetch::Hold);
+    control->setAnswer({true, false, {}, {}});
+    auto plugin = std::make_unique<PluginRecordingScheduleSettingSrv>();
+    plugin->SetRecordingSettingControl(control);
+
+    std::deque<ReplyRecorder> replies;
+    for (const QString &command : ReadFirstCommands) {
+        replies.emplace_back();
+        plugin->Request(command, QVariant(), RequestSenderInfo{}, replies.back().callback());
+    }
+    ASSERT_EQ(control->held(), ReadFirstCommands.size());
+    plugin.reset();
+
+    // The tunnel's thread delivers what it held.
+    std::thread tunnel([&] { control->deliverHeld(); });
+    tunnel.join();
+
+    for (std::size_t i = 0; i < replies.size(); ++i) {
+        const QString command = ReadFirstCommands.at(static_cast<int>(i));
+        ASSERT_EQ(replies[i].count(), 1) << command.toStdString();
+        EXPECT_TRUE(replies[i].last().flag) << command.toStdString();
+        EXPECT_EQ(replies[i].last().code, QStringLiteral("-1")) << command.toStdString();
+        EXPECT_FALSE(replies[i].last().data.isValid()) << command.toStdString();
+    }
+}
+
+TEST(PluginLifetime, DeletionRacingWithAnswersLeavesOneReplyPerRequest)
+{
+    for (int round = 0; round < 20; ++round) {
+        const auto control = QSharedPointer<FakeControl>::create();
+        control->setFetch(FakeControl::Fetch::Hold);
+        auto plugin = std::make_unique<PluginRecordingScheduleSettingSrv>();
+        plugin->SetRecordingSettingControl(control);
+
+        std::deque<ReplyRecorder> replies(40);
+        for (ReplyRecorder &reply : replies)
+            plugin->Request(QStringLiteral("GetAllScheduleRecInfo"), QVariant(),
+                            RequestSenderInfo{}, reply.callback());
+
+        std::thread tunnel([&] { control->deliverHeld(); });
+        plugin.reset(); // on the host's thread, while answers arrive
+        tunnel.join();
+
+        // Each request is answered either from its time cards (while the
+        // plug-in lived) or as failed (after it was gone), never both.
+        for (const ReplyRecorder &reply : replies) {
+            ASSERT_EQ(reply.count(), 1);
+            const ReplyRecorder::Reply answer = reply.last();
+            if (answer.code == QLatin1String("0"))
+                EXPECT_TRUE(answer.data.isValid());
+            else
+                EXPECT_EQ(answer.code, QStringLiteral("-1"));
+        }
+    }
+}
+
+TEST(PluginLifetime, ReplacedControlKeepsServingItsAnswers)
+{
+    const auto first = QSharedPointer<FakeControl>::create();
+    first->setFetch(FakeControl::Fetch::Hold);
+    PluginRecordingScheduleSettingSrv plugin;
+    plugin.SetRecordingSettingControl(first);
+    ReplyRecorder reply;
+    plugin.Request(QStringLiteral("GetScheduleRecInfo"), QVariant(), RequestSenderInfo{},
+                   reply.callback());
+    plugin.SetRecordingSettingControl(QSharedPointer<FakeControl>::create());
+
+    std::thread tunnel([&] { first->deliverHeld(); });
+    tunnel.join();
+    ASSERT_EQ(reply.count(), 1);
+    EXPECT_EQ(reply.last().code, QStringLiteral("0"));
+}
+
+} // namespace

@@ -1,0 +1,8 @@
+#include "HostCommands.h"
+
+#include "HostExit.h"
+
+int runDemo(const HostOptions &)
+{
+    return ExitOk;
+}

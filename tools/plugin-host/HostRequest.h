@@ -1,0 +1,29 @@
+#pragma once
+
+#include <QByteArray>
+#include <QString>
+#include <QVariant>
+
+#include <optional>
+#include <vector>
+
+// One request as plugin-host sends it to the plug-in.
+struct HostRequest
+{
+    QString command;
+    // Invalid when the request carries no payload.
+    QVariant payload;
+    // The requester's client number; the host's default when absent.
+    std::optional<qint64> client;
+};
+
+// Client numbers are whole numbers that JSON carries exactly: 0 to 2^53.
+std::optional<qint64> clientNumber(double value);
+std::optional<qint64> clientNumber(const QString &text);
+
+// Reads a session: JSON Lines, one object per line,
+// {"command": NAME, "payload": VALUE, "client": N}, "payload" and "client"
+// optional; blank lines are skipped. The whole text is checked before
+// anything is sent, so a bad line sends nothing: nothing, with
+// "line N: reason" in *error.
+std::optional<std::vector<HostRequest>> readSession(const QByteArray &text, QString *error);

@@ -1,0 +1,28 @@
+// plugin-host: loads the built recording schedule plug-in and runs requests
+// end to end against a simulated recording server on this machine.
+
+#include "HostCommandLine.h"
+#include "HostCommands.h"
+#include "HostExit.h"
+#include "HostOutput.h"
+#include "TraceOutput.h"
+
+#include <QCoreApplication>
+
+int main(int argc, char *argv[])
+{
+    QCoreApplication app(argc, argv);
+    QCoreApplication::setApplicationName(QStringLiteral("plugin-host"));
+    QCoreApplication::setApplicationVersion(QStringLiteral(PLUGIN_HOST_VERSION));
+
+    QString error;
+    const std::optional<HostOptions> options = parseHostCommandLine(app, &error);
+    if (!options) {
+        printError(error);
+        return ExitUsage;
+    }
+    // Before the plug-in loads: it opens the trace-log library as it loads.
+    if (options->traceLevel)
+        sendTraceToStandardError(*options->traceLevel);
+    return runHostCommand(*options);
+}
