@@ -86,6 +86,17 @@ TEST_F(CameraAssignment, ACameraTheTimecardHoldsIsNotAddedAgain)
     ExpectOneReply(h.replies, false, "0");
 }
 
+// One entry left behind would keep the camera recording by this time card.
+TEST_F(CameraAssignment, ACameraStandingTwiceIsRemovedEntirely)
+{
+    const Timecard five{5, 1, "Five", "", {{"C_1", "1"}, {"C_2", "2"}, {"C_1", "1"}}};
+    h.server.put(five);
+    h.request(Command, payload({entry("5", {{"C_1", "1"}})}, {}));
+    EXPECT_EQ(h.messages().back(),
+              msg("UpdRecTmcard", Expect::updateCameras(five, {{"C_2", "2"}})));
+    ExpectOneReply(h.replies, false, "0");
+}
+
 struct RemovalRow
 {
     const char *name;
