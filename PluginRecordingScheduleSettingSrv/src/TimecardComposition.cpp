@@ -123,11 +123,13 @@ QString RecordingSettingControl::ComposeScheRecTimeframeMsg(const QString &conte
     if (!rectangles.isArray())
         return {};
 
+    const QJsonArray list = rectangles.toArray();
     QString mapping;
     QString frame;
     QString days;
     QString interval;
-    for (const QJsonValue &entry : rectangles.toArray()) {
+    bool sized = false;
+    for (const QJsonValue &entry : list) {
         const QJsonObject rectangle = entry.toObject();
         frame.clear();
         days = ComposeDayListMsg(integerOf(rectangle.value(DocKey::Left)),
@@ -145,6 +147,12 @@ QString RecordingSettingControl::ComposeScheRecTimeframeMsg(const QString &conte
         // Escaped: a mode with '<' would otherwise end the element.
         TimecardTemplate::appendFilled(mapping, Template::MappingElement,
                                        {frame, TimecardTemplate::escaped(mode), triggers});
+        // Sized once from the first element: grown piecemeal, a large
+        // schedule's mapping would be copied over and over.
+        if (!sized) {
+            mapping.reserve(mapping.size() * list.size() * 5 / 4);
+            sized = true;
+        }
     }
     return mapping;
 }

@@ -22,7 +22,12 @@ void appendFilled(QString &out, QStringView pattern, std::initializer_list<QStri
 
 QString filled(QStringView pattern, std::initializer_list<QStringView> args)
 {
+    // One allocation: a body may carry megabytes of mapping content.
+    qsizetype size = pattern.size();
+    for (const QStringView arg : args)
+        size += arg.size();
     QString out;
+    out.reserve(size);
     appendFilled(out, pattern, args);
     return out;
 }

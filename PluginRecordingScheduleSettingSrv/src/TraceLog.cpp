@@ -15,7 +15,8 @@ namespace {
 
 // Written at start-up (or by a test before it starts threads), read after.
 std::atomic<LogTraceObject *> g_object{nullptr};
-std::int32_t g_moduleId = 0;
+// Atomic: a test re-attaches while answers of an earlier one may still log.
+std::atomic<std::int32_t> g_moduleId{0};
 
 constexpr std::int32_t RegisterKind = 19;
 constexpr const char *ModuleName = "RecordingScheduleSettingSrv";
@@ -77,15 +78,16 @@ const LibraryHolder g_library;
 
 void attach(LogTraceObject *object)
 {
-    g_moduleId = 0;
+    std::int32_t id = 0;
     if (object && object->registerModule)
-        object->registerModule(object->context, RegisterKind, ModuleName, &g_moduleId);
+        object->registerModule(object->context, RegisterKind, ModuleName, &id);
+    g_moduleId.store(id);
     g_object.store(object);
 }
 
 std::int32_t moduleId()
 {
-    return g_moduleId;
+    return g_moduleId.load();
 }
 
 const LogTraceObject *wanted(Level level, const char *sourceFile, int sourceLine)
@@ -93,9 +95,9 @@ const LogTraceObject *wanted(Level level, const char *sourceFile, int sourceLine
     const LogTraceObject *object = g_object.load();
     if (!object || !object->context || !object->filter)
         return nullptr;
-    const auto selector = static_cast<std::uint32_t>(g_moduleId) << 8 | level;
+    const auto selector = static_cast<std::uint32_t>(g_moduleId.load()) << 8 | level;
     return object->filter(object->context, selector, 0, sourceFile, sourceLine) == 0 ? object
-                                                                                    : nullptr;
+                                                                                     : nullptr;
 }
 
 Scope::Scope(const char *sourceFile, const char *function, int sourceLine)

@@ -81,7 +81,7 @@ public:
     void waitIdle();
 
     // Checks a fault specification; used by command lines before starting.
-    static bool checkFaults(const QString &spec, QString *error);
+    static bool checkFaults(const QString &text, QString *error);
 
 private:
     struct State;

@@ -82,63 +82,23 @@ TEST_P(CameraRemoval, UpdateKeepsEveryCameraNotNamedForRemoval)
 const QString Three =
     "<CamList>" + cam("C_1", "1") + cam("C_2", "2") + cam("C_3", "3") + "</CamList>";
 
-INSTANTIATE_TEST_SUITE_P(
-    Answers, CameraRemoval,
-    ::testing::Values(
-        Row{"MiddleCameraRemoved",
-            answerOf(Three),
-            {"C_2"},
-            updateOf("<CamList>" + kept("C_1", "1") + kept("C_3", "3") + "</CamList>")},
-        Row{"RemovingEveryCameraDropsTheCameraList",
-            answerOf(Three),
-            {"C_3", "C_1", "C_2"},
-            updateOf("")},
-        Row{"NoNamedCameraRewritesTheGroups",
-            answerOf(Three),
-            {"C_4"},
-            updateOf("<CamList>" + kept("C_1", "1") + kept("C_2", "2") + kept("C_3", "3") +
-                     "</CamList>")},
-        Row{"NamesAreComparedExactly",
-            answerOf("<CamList>" + cam("C_10", "1") + "</CamList>"),
-            {"C_1"},
-            updateOf("<CamList>" + kept("C_10", "1") + "</CamList>")},
-        Row{"LineBreaksAndIndentationKeepTheCameras",
-            answerOf("<CamList>\n  <Cam>\n    <Name>C_1</Name>\n    <GrpID>1</GrpID>\n  </Cam>\n"
-                     "  <Cam>\r\n<Name>C_2</Name><GrpID>2</GrpID></Cam>\n</CamList>"),
-            {"C_2"},
-            updateOf("<CamList>" + kept("C_1", "1") + "</CamList>")},
-        Row{"CameraNamedOtherwiseIsKept",
-            answerOf("<CamList>" + cam("Lobby &amp; Hall", "12") + cam("C_2", "2") +
-                     "<Cam><Name>cam-3</Name><GrpID>1</GrpID><Extra/></Cam></CamList>"),
-            {"C_2"},
-            updateOf("<CamList>" + kept("Lobby &amp; Hall", "12") + kept("cam-3", "1") +
-                     "</CamList>")},
-        Row{"ElementAfterTheCameraListIsKept",
-            answerOf(Three, "<Extra>1</Extra>"),
-            {"C_1", "C_2"},
-            updateOf("<CamList>" + kept("C_3", "3") + "</CamList>", "<Extra>1</Extra>")},
-        Row{"NoCameraListSendsTheTimecardUnchanged", answerOf(""), {"C_1"}, updateOf("")},
-        Row{"WhiteSpaceAroundTheAnswerIsIgnored",
-            "\r\n " + answerOf(Three) + " \n",
-            {"C_1", "C_3"},
-            updateOf("<CamList>" + kept("C_2", "2") + "</CamList>")},
-        Row{"AnswerWithoutTimecardStillSendsAnUpdate",
-            "<GetRecTmcardRes></GetRecTmcardRes>",
-            {"C_1"},
-            "<UpdRecTmcard></UpdRecTmcard>"},
-        Row{"AnswerOfAnotherKindSendsNothing",
-            "<Other>" + Head + Three + "</Tmcard></Other>",
-            {"C_1"},
-            QString()},
-        Row{"UnreadableCameraListSendsNothing",
-            answerOf("<CamList><Cam><Name>C_1</Cam></CamList>"),
-            {"C_1"},
-            QString()},
-        Row{"UnclosedCameraListSendsNothing",
-            answerOf("<CamList>" + cam("C_1", "1")),
-            {"C_2"},
-            QString()}),
+// clang-format off
+INSTANTIATE_TEST_SUITE_P(Answers, CameraRemoval, ::testing::Values(
+    Row{"MiddleCameraRemoved", answerOf(Three), {"C_2"}, updateOf("<CamList>" + kept("C_1", "1") + kept("C_3", "3") + "</CamList>")},
+    Row{"RemovingEveryCameraDropsTheCameraList", answerOf(Three), {"C_3", "C_1", "C_2"}, updateOf("")},
+    Row{"NoNamedCameraRewritesTheGroups", answerOf(Three), {"C_4"}, updateOf("<CamList>" + kept("C_1", "1") + kept("C_2", "2") + kept("C_3", "3") + "</CamList>")},
+    Row{"NamesAreComparedExactly", answerOf("<CamList>" + cam("C_10", "1") + "</CamList>"), {"C_1"}, updateOf("<CamList>" + kept("C_10", "1") + "</CamList>")},
+    Row{"LineBreaksAndIndentationKeepTheCameras", answerOf("<CamList>\n  <Cam>\n    <Name>C_1</Name>\n    <GrpID>1</GrpID>\n  </Cam>\n" "  <Cam>\r\n<Name>C_2</Name><GrpID>2</GrpID></Cam>\n</CamList>"), {"C_2"}, updateOf("<CamList>" + kept("C_1", "1") + "</CamList>")},
+    Row{"CameraNamedOtherwiseIsKept", answerOf("<CamList>" + cam("Lobby &amp; Hall", "12") + cam("C_2", "2") + "<Cam><Name>cam-3</Name><GrpID>1</GrpID><Extra/></Cam></CamList>"), {"C_2"}, updateOf("<CamList>" + kept("Lobby &amp; Hall", "12") + kept("cam-3", "1") + "</CamList>")},
+    Row{"ElementAfterTheCameraListIsKept", answerOf(Three, "<Extra>1</Extra>"), {"C_1", "C_2"}, updateOf("<CamList>" + kept("C_3", "3") + "</CamList>", "<Extra>1</Extra>")},
+    Row{"NoCameraListSendsTheTimecardUnchanged", answerOf(""), {"C_1"}, updateOf("")},
+    Row{"WhiteSpaceAroundTheAnswerIsIgnored", "\r\n " + answerOf(Three) + " \n", {"C_1", "C_3"}, updateOf("<CamList>" + kept("C_2", "2") + "</CamList>")},
+    Row{"AnswerWithoutTimecardStillSendsAnUpdate", "<GetRecTmcardRes></GetRecTmcardRes>", {"C_1"}, "<UpdRecTmcard></UpdRecTmcard>"},
+    Row{"AnswerOfAnotherKindSendsNothing", "<Other>" + Head + Three + "</Tmcard></Other>", {"C_1"}, QString()},
+    Row{"UnreadableCameraListSendsNothing", answerOf("<CamList><Cam><Name>C_1</Cam></CamList>"), {"C_1"}, QString()},
+    Row{"UnclosedCameraListSendsNothing", answerOf("<CamList>" + cam("C_1", "1")), {"C_2"}, QString()}),
     [](const auto &info) { return std::string(info.param.name); });
+// clang-format on
 
 TEST_F(RecordingSettingControlTest, FailedReadOrRefusedUpdateEndsInOneFailedCompletion)
 {

@@ -24,75 +24,40 @@ const QString TimecardAnswer = QStringLiteral(
 struct Operation
 {
     const char *name;
-    std::function<bool(RecordingSettingControl &, std::atomic<int> &calls)> start;
     QString command;
     bool requesterIdentity;
+    std::function<bool(RecordingSettingControl &, std::atomic<int> &calls)> start;
 };
 
-ControlResultCallback counting(std::atomic<int> &calls)
+ControlResultCallback result(std::atomic<int> &calls)
 {
     return [&calls](bool, bool) { ++calls; };
 }
+TimecardListCallback list(std::atomic<int> &calls)
+{
+    return [&calls](bool, bool, const QList<QVariant> &, const QString &) { ++calls; };
+}
 
-const QList<QVariant> TwoCameras{camera("C_1", "1"), camera("C_2", "2")};
+const QList<QVariant> Cams{camera("C_1", "1"), camera("C_2", "2")};
 const QMap<QString, QVariant> Summary{{"Revision", "5"}, {"TmcardID", "2"}};
 
+// clang-format off
 const Operation Operations[] = {
-    {"GetAllScheduleTimecardInfo",
-     [](auto &c, auto &n) {
-         return c.GetAllScheduleTimecardInfo([&n](bool, bool, auto &, auto &) { ++n; });
-     },
-     "GetRecTmcard", false},
-    {"GetScheduleTimecardInfoById",
-     [](auto &c, auto &n) {
-         return c.GetScheduleTimecardInfoById(4, [&n](bool, bool, auto &, auto &) { ++n; });
-     },
-     "GetRecTmcard", false},
-    {"RemoveTimecardCameraList",
-     [](auto &c, auto &n) { return c.RemoveTimecardCameraList(4, TwoCameras, counting(n)); },
-     "GetRecTmcard", false},
-    {"CreateDefaultContinuousTimecard",
-     [](auto &c, auto &n) { return c.CreateDefaultContinuousTimecard(TwoCameras, counting(n)); },
-     "InsRecTmcard", false},
-    {"UpdateDefaultContinuousTimecard",
-     [](auto &c, auto &n) {
-         return c.UpdateDefaultContinuousTimecard(Summary, TwoCameras, counting(n));
-     },
-     "UpdRecTmcard", false},
-    {"CreateDefaultEventTimecard",
-     [](auto &c, auto &n) { return c.CreateDefaultEventTimecard(TwoCameras, counting(n)); },
-     "InsRecTmcard", false},
-    {"UpdateDefaultEventTimecard",
-     [](auto &c, auto &n) {
-         return c.UpdateDefaultEventTimecard(Summary, TwoCameras, counting(n));
-     },
-     "UpdRecTmcard", false},
-    {"CreateCustomizeTimecard",
-     [](auto &c, auto &n) { return c.CreateCustomizeTimecard("{}", TwoCameras, counting(n)); },
-     "InsRecTmcard", false},
-    {"UpdateCustomizeTimecard",
-     [](auto &c, auto &n) {
-         return c.UpdateCustomizeTimecard(Summary, "{}", TwoCameras, counting(n));
-     },
-     "UpdRecTmcard", false},
-    {"AddSchedule",
-     [](auto &c, auto &n) {
-         return c.AddSchedule("Lobby", "{}", [&n](bool, bool, auto &) { ++n; });
-     },
-     "InsRecTmcard", true},
-    {"UpdateSchedule",
-     [](auto &c, auto &n) {
-         return c.UpdateSchedule("5", "2", "Lobby", "{}", TwoCameras, counting(n));
-     },
-     "UpdRecTmcard", true},
-    {"DeleteSchedule", [](auto &c, auto &n) { return c.DeleteSchedule(Summary, counting(n)); },
-     "DelTmcard", true},
-    {"UpdateTimecardCameraList",
-     [](auto &c, auto &n) {
-         return c.UpdateTimecardCameraList(TimecardAnswer, TwoCameras, counting(n), 0);
-     },
-     "UpdRecTmcard", true},
+    {"GetAllScheduleTimecardInfo", "GetRecTmcard", false, [](auto &c, auto &n) { return c.GetAllScheduleTimecardInfo(list(n)); }},
+    {"GetScheduleTimecardInfoById", "GetRecTmcard", false, [](auto &c, auto &n) { return c.GetScheduleTimecardInfoById(4, list(n)); }},
+    {"RemoveTimecardCameraList", "GetRecTmcard", false, [](auto &c, auto &n) { return c.RemoveTimecardCameraList(4, Cams, result(n)); }},
+    {"CreateDefaultContinuousTimecard", "InsRecTmcard", false, [](auto &c, auto &n) { return c.CreateDefaultContinuousTimecard(Cams, result(n)); }},
+    {"UpdateDefaultContinuousTimecard", "UpdRecTmcard", false, [](auto &c, auto &n) { return c.UpdateDefaultContinuousTimecard(Summary, Cams, result(n)); }},
+    {"CreateDefaultEventTimecard", "InsRecTmcard", false, [](auto &c, auto &n) { return c.CreateDefaultEventTimecard(Cams, result(n)); }},
+    {"UpdateDefaultEventTimecard", "UpdRecTmcard", false, [](auto &c, auto &n) { return c.UpdateDefaultEventTimecard(Summary, Cams, result(n)); }},
+    {"CreateCustomizeTimecard", "InsRecTmcard", false, [](auto &c, auto &n) { return c.CreateCustomizeTimecard("{}", Cams, result(n)); }},
+    {"UpdateCustomizeTimecard", "UpdRecTmcard", false, [](auto &c, auto &n) { return c.UpdateCustomizeTimecard(Summary, "{}", Cams, result(n)); }},
+    {"AddSchedule", "InsRecTmcard", true, [](auto &c, auto &n) { return c.AddSchedule("L", "{}", [&n](bool, bool, auto &) { ++n; }); }},
+    {"UpdateSchedule", "UpdRecTmcard", true, [](auto &c, auto &n) { return c.UpdateSchedule("5", "2", "L", "{}", Cams, result(n)); }},
+    {"DeleteSchedule", "DelTmcard", true, [](auto &c, auto &n) { return c.DeleteSchedule(Summary, result(n)); }},
+    {"UpdateTimecardCameraList", "UpdRecTmcard", true, [](auto &c, auto &n) { return c.UpdateTimecardCameraList(TimecardAnswer, Cams, result(n), 0); }},
 };
+// clang-format on
 
 void PrintTo(const Operation &op, std::ostream *out)
 {
@@ -124,6 +89,8 @@ TEST_P(SendPath, SendsOneWellFormedRequestWithTheOperationsCommandAndIdentity)
               op.requesterIdentity ? static_cast<void *>(&requester) : tunnel.ownId());
     EXPECT_TRUE(isWellFormedXml(sent.body)) << sent.body.toStdString();
     EXPECT_EQ(calls, 0) << "the completion waits for the answer";
+    tunnel.deliverAll();
+    EXPECT_EQ(calls, 1);
 }
 
 TEST_P(SendPath, RefusedSendReturnsFalseAndNeverCallsTheCompletion)
@@ -163,6 +130,7 @@ TEST(Reads, BodiesAreTheReadTemplates)
     EXPECT_EQ(bodies, QStringList({"<GetRecTmcard><TmcardAll>true</TmcardAll></GetRecTmcard>",
                                    "<GetRecTmcard><TmcardID>0</TmcardID></GetRecTmcard>",
                                    "<GetRecTmcard><TmcardID>-12</TmcardID></GetRecTmcard>"}));
+    tunnel.deliverAll();
 }
 
 TEST(Identity, StoredIdentityIsReadAtTheMomentOfEachSend)
@@ -178,16 +146,20 @@ TEST(Identity, StoredIdentityIsReadAtTheMomentOfEachSend)
     ASSERT_EQ(tunnel.sent().size(), 2);
     EXPECT_EQ(tunnel.sent()[0].clientId, &first);
     EXPECT_EQ(tunnel.sent()[1].clientId, &second);
+    tunnel.deliverAll();
 }
 
-// One answer to one handler, and what the completion and the error log see.
+// One answer to one of the three handlers, and what the completion and the
+// error log see; every row runs with the tunnel's flag false and true.
+enum class Handler { Read, Insert, Result };
+
 struct AnswerRow
 {
     const char *name;
+    Handler handler;
     Answer answer;
-    bool needsConverter;
     bool ok;
-    QString payload; // the time card names read, or the new identifier
+    QString payload; // names of the time cards read, or the new identifier
     QString logged;
 };
 
@@ -196,170 +168,70 @@ void PrintTo(const AnswerRow &row, std::ostream *out)
     *out << row.name;
 }
 
-QString timecardNames(const QList<QVariant> &timecards)
-{
-    QStringList names;
-    for (const QVariant &t : timecards)
-        names << t.toMap().value("Name").toString();
-    return names.join(',');
-}
-
-class ReadAnswer : public ::testing::TestWithParam<AnswerRow>
+class Answers : public ::testing::TestWithParam<AnswerRow>
 {};
 
-TEST_P(ReadAnswer, CompletionGetsTheTimecardsAndTheFlagUnchanged)
+TEST_P(Answers, CompletionGetsWhatTheAnswerSaysAndTheFlagUnchanged)
 {
     const AnswerRow &row = GetParam();
-    if (row.needsConverter)
+    if (row.ok && row.handler != Handler::Result)
         REQUIRE_CONVERTER();
     TestLog log;
     log.attach();
     for (const bool flag : {false, true}) {
         TestTunnel tunnel;
-        Answer answer = row.answer;
-        answer.flag = flag;
-        tunnel.queueAnswer(answer);
+        tunnel.queueAnswer(Answer{row.answer.ok, row.answer.code, row.answer.content, flag});
         RecordingSettingControl control(&tunnel);
         Completion done;
-        ASSERT_TRUE(control.GetAllScheduleTimecardInfo(done.timecardList()));
+        if (row.handler == Handler::Read)
+            control.GetAllScheduleTimecardInfo(done.timecardList());
+        else if (row.handler == Handler::Insert)
+            control.AddSchedule("L", "{}", done.timecardId());
+        else
+            control.DeleteSchedule(Summary, done.result());
         EXPECT_EQ(done.calls, 1);
         EXPECT_EQ(done.ok, row.ok);
         EXPECT_EQ(done.flag, flag);
-        EXPECT_EQ(timecardNames(done.timecards), row.payload);
-        EXPECT_EQ(done.text, row.ok ? answer.content : QString());
+        QStringList names;
+        for (const QVariant &t : done.timecards)
+            names << t.toMap().value("Name").toString();
+        EXPECT_EQ(row.handler == Handler::Read ? names.join(',') : done.text, row.payload);
+        if (row.handler == Handler::Read) {
+            EXPECT_EQ(done.text, row.ok ? row.answer.content : QString());
+        }
     }
     const QStringList logged = row.logged.isEmpty() ? QStringList() : QStringList{row.logged};
     EXPECT_EQ(log.texts(2), logged + logged) << "one record per failed answer";
 }
 
-const QString GetFailed = QStringLiteral(
-    "RecordingSettingControl::HdlrTunnelReqGetRecTimecard, HdlrTunnelReqGetRecTimecard failed: "
-    "success:%1, reqRespCode:%2");
+const QString Failed =
+    QStringLiteral("RecordingSettingControl::%1, %1 failed: success:%2, reqRespCode:%3");
+const QString Read = QStringLiteral("HdlrTunnelReqGetRecTimecard");
+const QString Insert = QStringLiteral("HdlrAddScheduleCallback");
+const QString Result = QStringLiteral("HdlrTunnelReqCallback");
+const QString Two = QStringLiteral("<GetRecTmcardRes><Tmcard><Name>B</Name></"
+                                   "Tmcard><Tmcard><Name>A</Name></Tmcard></GetRecTmcardRes>");
 
-const AnswerRow ReadRows[] = {
-    {"LoneTimecardIsAListOfOne", {true, "0", OneTimecard, false}, true, true, "Lobby", ""},
-    {"RepeatedTimecardsKeepTheirOrder",
-     {true, "0",
-      "<GetRecTmcardRes><Tmcard><Name>B</Name></Tmcard><Tmcard><Name>A</Name></Tmcard>"
-      "</GetRecTmcardRes>",
-      false},
-     true,
-     true,
-     "B,A",
-     ""},
-    {"NoTimecardIsAnEmptyList",
-     {true, "0", "<GetRecTmcardRes><Other>1</Other></GetRecTmcardRes>", false},
-     true,
-     true,
-     "",
-     ""},
-    {"FailedExchange",
-     {false, "0", OneTimecard, false},
-     false,
-     false,
-     "",
-     GetFailed.arg(0).arg("0")},
-    {"ServerRefusal",
-     {true, "-7", OneTimecard, false},
-     false,
-     false,
-     "",
-     GetFailed.arg(1).arg("-7")},
-    {"UnreadableAnswer",
-     {true, "0", "<GetRecTmcardRes><Tmcard>", false},
-     false,
-     false,
-     "",
-     "RecordingSettingControl::HdlrTunnelReqGetRecTimecard, parse Get Recording Timecard "
-     "failed."},
-};
-INSTANTIATE_TEST_SUITE_P(Answers, ReadAnswer, ::testing::ValuesIn(ReadRows),
-                         [](const auto &info) { return std::string(info.param.name); });
-
-class InsertAnswer : public ::testing::TestWithParam<AnswerRow>
-{};
-
-TEST_P(InsertAnswer, CompletionGetsTheNewIdentifierAndTheFlagUnchanged)
-{
-    const AnswerRow &row = GetParam();
-    if (row.needsConverter)
-        REQUIRE_CONVERTER();
-    TestLog log;
-    log.attach();
-    TestTunnel tunnel;
-    Answer answer = row.answer;
-    answer.flag = true;
-    tunnel.queueAnswer(answer);
-    RecordingSettingControl control(&tunnel);
-    Completion done;
-    ASSERT_TRUE(control.AddSchedule("Lobby", "{}", done.timecardId()));
-    EXPECT_EQ(done.calls, 1);
-    EXPECT_EQ(done.ok, row.ok);
-    EXPECT_TRUE(done.flag);
-    EXPECT_EQ(done.text, row.payload);
-    EXPECT_EQ(log.texts(2), (row.logged.isEmpty() ? QStringList() : QStringList{row.logged}));
-}
-
-const QString AddFailed = QStringLiteral(
-    "RecordingSettingControl::HdlrAddScheduleCallback, HdlrAddScheduleCallback failed: "
-    "success:%1, reqRespCode:%2");
-
-const AnswerRow InsertRows[] = {
-    {"IdentifierIsRead",
-     {true, "0", "<InsRecTmcardRes><TmcardID>42</TmcardID></InsRecTmcardRes>", false},
-     true,
-     true,
-     "42",
-     ""},
-    {"AnswerWithoutIdentifierStillSucceeds",
-     {true, "0", "<InsRecTmcardRes><Other>1</Other></InsRecTmcardRes>", false},
-     true,
-     true,
-     "",
-     ""},
-    {"FailedExchange", {false, "0", "", false}, false, false, "", AddFailed.arg(0).arg("0")},
-    {"ServerRefusal", {true, "12", "", false}, false, false, "", AddFailed.arg(1).arg("12")},
-    {"UnreadableAnswer",
-     {true, "0", "not xml", false},
-     false,
-     false,
-     "",
-     "RecordingSettingControl::HdlrAddScheduleCallback, parse InsRecTmcardRes failed."},
-};
-INSTANTIATE_TEST_SUITE_P(Answers, InsertAnswer, ::testing::ValuesIn(InsertRows),
-                         [](const auto &info) { return std::string(info.param.name); });
-
-TEST(ResultAnswer, OnlyOkWithCodeZeroSucceedsAndTheFlagIsHandedOn)
-{
-    const QString failed = QStringLiteral(
-        "RecordingSettingControl::HdlrTunnelReqCallback, HdlrTunnelReqCallback failed: "
-        "success:%1, reqRespCode:%2");
-    const struct
-    {
-        Answer answer;
-        bool ok;
-        QString logged;
-    } rows[] = {
-        {{true, "0", "ignored", true}, true, ""},
-        {{true, "0", "", false}, true, ""},
-        {{false, "0", "", true}, false, failed.arg(0).arg("0")},
-        {{true, "00", "", false}, false, failed.arg(1).arg("00")},
-        {{true, "", "", true}, false, failed.arg(1).arg("")},
-    };
-    for (const auto &row : rows) {
-        TestLog log;
-        log.attach();
-        TestTunnel tunnel;
-        tunnel.queueAnswer(row.answer);
-        RecordingSettingControl control(&tunnel);
-        Completion done;
-        ASSERT_TRUE(control.DeleteSchedule(Summary, done.result()));
-        EXPECT_EQ(done.calls, 1);
-        EXPECT_EQ(done.ok, row.ok);
-        EXPECT_EQ(done.flag, row.answer.flag);
-        EXPECT_EQ(log.texts(2), (row.logged.isEmpty() ? QStringList() : QStringList{row.logged}));
-    }
-}
+// clang-format off
+INSTANTIATE_TEST_SUITE_P(Handlers, Answers, ::testing::Values(
+    AnswerRow{"LoneTimecardIsAListOfOne", Handler::Read, {true, "0", OneTimecard}, true, "Lobby", ""},
+    AnswerRow{"RepeatedTimecardsKeepTheirOrder", Handler::Read, {true, "0", Two}, true, "B,A", ""},
+    AnswerRow{"NoTimecardIsAnEmptyList", Handler::Read, {true, "0", "<GetRecTmcardRes><X/></GetRecTmcardRes>"}, true, "", ""},
+    AnswerRow{"ReadExchangeFailed", Handler::Read, {false, "0", OneTimecard}, false, "", Failed.arg(Read).arg(0).arg("0")},
+    AnswerRow{"ReadRefused", Handler::Read, {true, "-7", OneTimecard}, false, "", Failed.arg(Read).arg(1).arg("-7")},
+    AnswerRow{"ReadUnreadable", Handler::Read, {true, "0", "<GetRecTmcardRes><Tmcard>"}, false, "",
+              "RecordingSettingControl::HdlrTunnelReqGetRecTimecard, parse Get Recording Timecard failed."},
+    AnswerRow{"NewIdentifierIsRead", Handler::Insert, {true, "0", "<InsRecTmcardRes><TmcardID>42</TmcardID></InsRecTmcardRes>"}, true, "42", ""},
+    AnswerRow{"InsertWithoutIdentifierSucceeds", Handler::Insert, {true, "0", "<InsRecTmcardRes><X/></InsRecTmcardRes>"}, true, "", ""},
+    AnswerRow{"InsertExchangeFailed", Handler::Insert, {false, "0", ""}, false, "", Failed.arg(Insert).arg(0).arg("0")},
+    AnswerRow{"InsertRefused", Handler::Insert, {true, "12", ""}, false, "", Failed.arg(Insert).arg(1).arg("12")},
+    AnswerRow{"InsertUnreadable", Handler::Insert, {true, "0", "not xml"}, false, "",
+              "RecordingSettingControl::HdlrAddScheduleCallback, parse InsRecTmcardRes failed."},
+    AnswerRow{"ResultContentIsNotRead", Handler::Result, {true, "0", "not xml"}, true, "", ""},
+    AnswerRow{"ResultExchangeFailed", Handler::Result, {false, "0", ""}, false, "", Failed.arg(Result).arg(0).arg("0")},
+    AnswerRow{"ResultCodeMustBeExactlyZero", Handler::Result, {true, "00", ""}, false, "", Failed.arg(Result).arg(1).arg("00")}),
+    [](const auto &info) { return std::string(info.param.name); });
+// clang-format on
 
 TEST(Lifetime, ReleasedControlLivesUntilEachOfItsAnswersIsHandled)
 {

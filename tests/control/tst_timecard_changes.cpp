@@ -167,45 +167,21 @@ TEST_P(CameraListEdit, TimecardGoesBackWithOnlyItsCameraListReplaced)
     EXPECT_EQ(tunnel.sent().last().clientId, &requester);
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Answers, CameraListEdit,
-    ::testing::Values(
-        EditRow{"CamerasReplaced",
-                answerOf(Head + OldCameras + "</Tmcard>"),
-                {camera("C_9", "4")},
-                updateOf(Head + NewCameras + "</Tmcard>")},
-        EditRow{"EmptyListRemovesTheCameraList",
-                answerOf(Head + OldCameras + "</Tmcard>"),
-                {},
-                updateOf(Head + "</Tmcard>")},
-        EditRow{"NoCameraListGetsOneLast",
-                answerOf(Head + "</Tmcard>"),
-                {camera("C_9", "4")},
-                updateOf(Head + NewCameras + "</Tmcard>")},
-        EditRow{"EmptyCameraListElementIsReplaced",
-                answerOf(Head + "<CamList/></Tmcard>"),
-                {camera("C_9", "4")},
-                updateOf(Head + NewCameras + "</Tmcard>")},
-        EditRow{"ElementAfterTheCameraListIsKept",
-                answerOf(Head + OldCameras + "<Extra>1</Extra></Tmcard>"),
-                {camera("C_9", "4")},
-                updateOf(Head + NewCameras + "<Extra>1</Extra></Tmcard>")},
-        EditRow{"DeclarationAndWhiteSpaceSkipped",
-                "\n <?xml version=\"1.0\"?>\n" + answerOf(Head + OldCameras + "</Tmcard>") + "\n",
-                {camera("C_9", "4")},
-                updateOf(Head + NewCameras + "</Tmcard>")},
-        EditRow{"AnswerOfAnotherKindIsRefused",
-                "<InsRecTmcardRes><Tmcard></Tmcard></InsRecTmcardRes>",
-                {},
-                QString()},
-        EditRow{"TruncatedAnswerIsRefused", answerOf(Head + OldCameras).chopped(1), {}, QString()},
-        EditRow{"UnclosedCameraListIsRefused",
-                answerOf(Head + "<CamList><Cam><Name>C_1</Name></Cam></Tmcard>"),
-                {},
-                QString()},
-        EditRow{"IllFormedTimecardIsRefused", answerOf("<Tmcard><Name>a</Tmcard>"), {}, QString()},
-        EditRow{"EmptyAnswerIsRefused", QString(""), {}, QString()}),
+// clang-format off
+INSTANTIATE_TEST_SUITE_P(Answers, CameraListEdit, ::testing::Values(
+    EditRow{"CamerasReplaced", answerOf(Head + OldCameras + "</Tmcard>"), {camera("C_9", "4")}, updateOf(Head + NewCameras + "</Tmcard>")},
+    EditRow{"EmptyListRemovesTheCameraList", answerOf(Head + OldCameras + "</Tmcard>"), {}, updateOf(Head + "</Tmcard>")},
+    EditRow{"NoCameraListGetsOneLast", answerOf(Head + "</Tmcard>"), {camera("C_9", "4")}, updateOf(Head + NewCameras + "</Tmcard>")},
+    EditRow{"EmptyCameraListElementIsReplaced", answerOf(Head + "<CamList/></Tmcard>"), {camera("C_9", "4")}, updateOf(Head + NewCameras + "</Tmcard>")},
+    EditRow{"ElementAfterTheCameraListIsKept", answerOf(Head + OldCameras + "<Extra>1</Extra></Tmcard>"), {camera("C_9", "4")}, updateOf(Head + NewCameras + "<Extra>1</Extra></Tmcard>")},
+    EditRow{"DeclarationAndWhiteSpaceSkipped", "\n <?xml version=\"1.0\"?>\n" + answerOf(Head + OldCameras + "</Tmcard>") + "\n", {camera("C_9", "4")}, updateOf(Head + NewCameras + "</Tmcard>")},
+    EditRow{"AnswerOfAnotherKindIsRefused", "<InsRecTmcardRes><Tmcard></Tmcard></InsRecTmcardRes>", {}, QString()},
+    EditRow{"TruncatedAnswerIsRefused", answerOf(Head + OldCameras).chopped(1), {}, QString()},
+    EditRow{"UnclosedCameraListIsRefused", answerOf(Head + "<CamList><Cam><Name>C_1</Name></Cam></Tmcard>"), {}, QString()},
+    EditRow{"IllFormedTimecardIsRefused", answerOf("<Tmcard><Name>a</Tmcard>"), {}, QString()},
+    EditRow{"EmptyAnswerIsRefused", QString(""), {}, QString()}),
     [](const auto &info) { return std::string(info.param.name); });
+// clang-format on
 
 TEST(CameraListEdit, WithoutCompletionNothingIsSent)
 {

@@ -150,19 +150,18 @@ TEST_P(DayList, DaysFromLeftPlusOneToRightWithinTheWeek)
     EXPECT_EQ(mapping.mid(from, mapping.indexOf("</DayList>") + 10 - from), GetParam().expected);
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Rectangles, DayList,
-    ::testing::Values(Row{"SixToSevenIsDaySeven", R"("Left":6,"Right":7)", days({7})},
-                      Row{"EqualBoundsGiveNoDay", R"("Left":3,"Right":3)", days({})},
-                      Row{"ReversedBoundsGiveNoDay", R"("Left":5,"Right":2)", days({})},
-                      Row{"WholeWeek", R"("Left":0,"Right":7)", days({1, 2, 3, 4, 5, 6, 7})},
-                      Row{"NegativeLeftStartsAtDayOne", R"("Left":-5,"Right":2)", days({1, 2})},
-                      Row{"HugeRightStopsAtDaySeven", R"("Left":5,"Right":2000000000)",
-                          days({6, 7})},
-                      Row{"BeyondIntRangeSaturates", R"("Left":-1e300,"Right":1e300)",
-                          days({1, 2, 3, 4, 5, 6, 7})},
-                      Row{"MissingBoundsGiveNoDay", R"("Top":0)", days({})}),
+// clang-format off
+INSTANTIATE_TEST_SUITE_P(Rectangles, DayList, ::testing::Values(
+    Row{"SixToSevenIsDaySeven", R"("Left":6,"Right":7)", days({7})},
+    Row{"EqualBoundsGiveNoDay", R"("Left":3,"Right":3)", days({})},
+    Row{"ReversedBoundsGiveNoDay", R"("Left":5,"Right":2)", days({})},
+    Row{"WholeWeek", R"("Left":0,"Right":7)", days({1, 2, 3, 4, 5, 6, 7})},
+    Row{"NegativeLeftStartsAtDayOne", R"("Left":-5,"Right":2)", days({1, 2})},
+    Row{"HugeRightStopsAtDaySeven", R"("Left":5,"Right":2000000000)", days({6, 7})},
+    Row{"BeyondIntRangeSaturates", R"("Left":-1e300,"Right":1e300)", days({1, 2, 3, 4, 5, 6, 7})},
+    Row{"MissingBoundsGiveNoDay", R"("Top":0)", days({})}),
     [](const auto &info) { return std::string(info.param.name); });
+// clang-format on
 
 class Interval : public ::testing::TestWithParam<Row>
 {};
@@ -174,18 +173,15 @@ TEST_P(Interval, HoursBecomeSecondsRoundedToTheNearest)
     EXPECT_EQ(mapping.mid(from, mapping.indexOf("</Intervals>") - from), GetParam().expected);
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Rectangles, Interval,
-    ::testing::Values(Row{"QuarterHours", R"("Top":8.25,"Bottom":24)",
-                          R"(<Ele B="29700" E="86400"/>)"},
-                      Row{"SixDigitHoursKeepTheirSecond", R"("Top":0.333333,"Bottom":23.9997)",
-                          R"(<Ele B="1200" E="86399"/>)"},
-                      Row{"HugeHoursSaturate", R"("Top":-1e300,"Bottom":1e300)",
-                          R"(<Ele B="-2147483648" E="2147483647"/>)"},
-                      Row{"MissingHoursAreZero", R"("Left":0)", R"(<Ele B="0" E="0"/>)"},
-                      Row{"OutOfDayGoesOutAsComputed", R"("Top":-1,"Bottom":25)",
-                          R"(<Ele B="-3600" E="90000"/>)"}),
+// clang-format off
+INSTANTIATE_TEST_SUITE_P(Rectangles, Interval, ::testing::Values(
+    Row{"QuarterHours", R"("Top":8.25,"Bottom":24)", R"(<Ele B="29700" E="86400"/>)"},
+    Row{"SixDigitHoursKeepTheirSecond", R"("Top":0.333333,"Bottom":23.9997)", R"(<Ele B="1200" E="86399"/>)"},
+    Row{"HugeHoursSaturate", R"("Top":-1e300,"Bottom":1e300)", R"(<Ele B="-2147483648" E="2147483647"/>)"},
+    Row{"MissingHoursAreZero", R"("Left":0)", R"(<Ele B="0" E="0"/>)"},
+    Row{"OutOfDayGoesOutAsComputed", R"("Top":-1,"Bottom":25)", R"(<Ele B="-3600" E="90000"/>)"}),
     [](const auto &info) { return std::string(info.param.name); });
+// clang-format on
 
 TEST_F(RecordingSettingControlTest, EverySecondOfTheDaySurvivesTheTripThroughTheDocument)
 {
@@ -233,27 +229,18 @@ TEST_P(Triggers, NonZeroTriggerElements)
     EXPECT_EQ(triggerSet(GetParam().input), GetParam().expected);
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    EventRectangles, Triggers,
-    ::testing::Values(
-        Row{"OnlyMotion", R"({"motion":true})", "Motion=1 ContMotNum=1"},
-        Row{"DigitalInputOnTrigger",
-            R"({"di":true,"traditional":true,"recordingStateTrigger":true})",
-            "ContMotNum=1 DigiInput=1"},
-        Row{"DigitalInputOnNormal", R"({"di":true,"traditional":true,"recordingStateNormal":true})",
-            "ContMotNum=1 DigiInput=2"},
-        Row{"DigitalInputOnBoth",
-            R"({"di":true,"traditional":true,"recordingStateTrigger":true,"recordingStateNormal":true})",
-            "ContMotNum=1 DigiInput=3"},
-        Row{"DigitalInputWithoutStates", R"({"di":true,"traditional":true})", "ContMotNum=1"},
-        Row{"NotTraditionalIgnoresStates",
-            R"({"di":true,"traditional":false,"recordingStateTrigger":true})", "ContMotNum=1"},
-        Row{"StopUntilFlagsStandOnTheirOwn",
-            R"({"activatedToNormal":true,"normalToActivated":true,"Motion":true})",
-            "ContMotNum=1 StopUntilDIFalling=1 StopUntilDIRising=1"},
-        Row{"LastOfTheTable", R"({"smokeAndFlameDetection":true,"pptz":1})",
-            "ContMotNum=1 PPTZTrigger=1 SmokeAndFlameDetection=1"}),
+// clang-format off
+INSTANTIATE_TEST_SUITE_P(EventRectangles, Triggers, ::testing::Values(
+    Row{"OnlyMotion", R"({"motion":true})", "Motion=1 ContMotNum=1"},
+    Row{"DigitalInputOnTrigger", R"({"di":true,"traditional":true,"recordingStateTrigger":true})", "ContMotNum=1 DigiInput=1"},
+    Row{"DigitalInputOnNormal", R"({"di":true,"traditional":true,"recordingStateNormal":true})", "ContMotNum=1 DigiInput=2"},
+    Row{"DigitalInputOnBoth", R"({"di":true,"traditional":true,"recordingStateTrigger":true,"recordingStateNormal":true})", "ContMotNum=1 DigiInput=3"},
+    Row{"DigitalInputWithoutStates", R"({"di":true,"traditional":true})", "ContMotNum=1"},
+    Row{"NotTraditionalIgnoresStates", R"({"di":true,"traditional":false,"recordingStateTrigger":true})", "ContMotNum=1"},
+    Row{"StopUntilFlagsStandOnTheirOwn", R"({"activatedToNormal":true,"normalToActivated":true,"Motion":true})", "ContMotNum=1 StopUntilDIFalling=1 StopUntilDIRising=1"},
+    Row{"LastOfTheTable", R"({"smokeAndFlameDetection":true,"pptz":1})", "ContMotNum=1 PPTZTrigger=1 SmokeAndFlameDetection=1"}),
     [](const auto &info) { return std::string(info.param.name); });
+// clang-format on
 
 TEST(Triggers, OnlyTheExactEventModeGetsTriggerElements)
 {
@@ -326,17 +313,18 @@ TEST_P(Escaping, NameCameraAndModeReadBackAsSent)
     EXPECT_EQ(body.count("<Tmcard>"), 1);
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Texts, Escaping,
-    ::testing::Values(
-        Row{"MarkupCannotRewriteAnotherField", "A</Name><TmcardID>5</TmcardID><Name>B", {}},
-        Row{"AmpersandAndLessThan", "R&D <1> & 2", {}}, Row{"Quotes", R"(say "hi" 'there')", {}},
-        Row{"MarkerInsideANameIsNotFilled", "50%1 off %2%3", {}},
-        Row{"EntityLookalike", "&amp;&lt;", {}}, Row{"CarriageReturnSurvives", "a\r\nb\rc", {}},
-        Row{"CharacterXmlCannotCarryIsReplaced", QString("a") + QChar(1) + "b",
-            QString("a") + QChar(0xFFFD) + "b"},
-        Row{"LoneSurrogateIsReplaced", QString("a") + QChar(0xD800), QString("a") + QChar(0xFFFD)},
-        Row{"PairedSurrogatesStay", QString::fromUtf8("cam \xF0\x9F\x93\xB7"), {}}),
+// clang-format off
+INSTANTIATE_TEST_SUITE_P(Texts, Escaping, ::testing::Values(
+    Row{"MarkupCannotRewriteAnotherField", "A</Name><TmcardID>5</TmcardID><Name>B", {}},
+    Row{"AmpersandAndLessThan", "R&D <1> & 2", {}},
+    Row{"Quotes", R"(say "hi" 'there')", {}},
+    Row{"MarkerInsideANameIsNotFilled", "50%1 off %2%3", {}},
+    Row{"EntityLookalike", "&amp;&lt;", {}},
+    Row{"CarriageReturnSurvives", "a\r\nb\rc", {}},
+    Row{"CharacterXmlCannotCarryIsReplaced", QString("a") + QChar(1) + "b", QString("a") + QChar(0xFFFD) + "b"},
+    Row{"LoneSurrogateIsReplaced", QString("a") + QChar(0xD800), QString("a") + QChar(0xFFFD)},
+    Row{"PairedSurrogatesStay", QString::fromUtf8("cam \xF0\x9F\x93\xB7"), {}}),
     [](const auto &info) { return std::string(info.param.name); });
+// clang-format on
 
 } // namespace

@@ -110,6 +110,25 @@ TEST_F(Lifecycle, InitialisationWithTunnelReplacesTheControl)
     EXPECT_EQ(framework.asked, 2);
 }
 
+TEST_F(Lifecycle, SecondInitialisationSendsThroughTheSecondTunnel)
+{
+    TestTunnel first;
+    TestTunnel second;
+    Framework framework;
+    PluginRecordingScheduleSettingSrv plugin;
+    framework.tunnel = &first;
+    ASSERT_TRUE(plugin.InitialPluginBase(&framework));
+    framework.tunnel = &second;
+    ASSERT_TRUE(plugin.InitialPluginBase(&framework));
+
+    ReplyRecorder reply;
+    plugin.Request(QStringLiteral("GetScheduleRecInfo"), QVariant(), RequestSenderInfo{},
+                   reply.callback());
+    EXPECT_TRUE(first.sent().isEmpty());
+    EXPECT_EQ(second.commands(), QStringList{QStringLiteral("GetRecTmcard")});
+    EXPECT_EQ(reply.count(), 1);
+}
+
 TEST_F(Lifecycle, FailedInitialisationKeepsThePreviousControl)
 {
     const auto fake = QSharedPointer<FakeControl>::create();

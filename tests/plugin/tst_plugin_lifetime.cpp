@@ -8,6 +8,9 @@
 #include "QtPrinters.h"
 #include "ReplyRecorder.h"
 #include "RequestSenderInfo.h"
+#include "TestTunnel.h"
+
+#include "IFrameworkTools.h"
 
 #include <gtest/gtest.h>
 
@@ -86,6 +89,42 @@ TEST(PluginLifetime, DeletionRacingWithAnswersLeavesOneReplyPerRequest)
                 EXPECT_EQ(answer.code, QStringLiteral("-1"));
         }
     }
+}
+
+struct Framework : IFrameworkTools
+{
+    IKoltTunnelClient *tunnel = nullptr;
+    IKoltTunnelClient *GetTunnelClient() override { return tunnel; }
+};
+
+// The same through the real control: the tunnel holds the answers, the host
+// deletes the plug-in, then the tunnel's thread delivers them.
+TEST(PluginLifetime, TunnelAnswersPastDeletionAreEachAnsweredOnce)
+{
+    TestTunnel tunnel(TestTunnel::Delivery::Held);
+    Framework framework;
+    framework.tunnel = &tunnel;
+    auto plugin = std::make_unique<PluginRecordingScheduleSettingSrv>();
+    ASSERT_TRUE(plugin->InitialPluginBase(&framework));
+
+    std::deque<ReplyRecorder> replies;
+    for (const QString &command : ReadFirstCommands) {
+        replies.emplace_back();
+        plugin->Request(command, QVariant(), RequestSenderInfo{}, replies.back().callback());
+    }
+    ASSERT_EQ(tunnel.pending(), ReadFirstCommands.size());
+    plugin.reset();
+
+    std::thread delivery([&] { tunnel.deliverAll(); });
+    delivery.join();
+
+    for (std::size_t i = 0; i < replies.size(); ++i) {
+        const std::string command = ReadFirstCommands.at(static_cast<int>(i)).toStdString();
+        ASSERT_EQ(replies[i].count(), 1) << command;
+        EXPECT_TRUE(replies[i].last().flag) << command;
+        EXPECT_EQ(replies[i].last().code, QStringLiteral("-1")) << command;
+    }
+    EXPECT_EQ(tunnel.sent().size(), ReadFirstCommands.size()) << "nothing sent after deletion";
 }
 
 TEST(PluginLifetime, ReplacedControlKeepsServingItsAnswers)

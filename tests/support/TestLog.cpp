@@ -74,7 +74,9 @@ void TestLog::clear()
 
 void TestLog::registerModule(void *context, std::int32_t, const char *, std::int32_t *moduleId)
 {
-    *moduleId = static_cast<TestLog *>(context)->m_moduleId;
+    // Like the real library, an object without a context hands out nothing.
+    if (context && moduleId)
+        *moduleId = static_cast<TestLog *>(context)->m_moduleId;
 }
 
 std::int32_t TestLog::filter(void *context, std::uint32_t selector, std::int32_t,

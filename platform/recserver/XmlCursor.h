@@ -1,0 +1,45 @@
+#pragma once
+
+#include "Timecard.h"
+
+#include <QString>
+#include <QStringView>
+#include <QXmlStreamReader>
+
+// Walks a request body element by element and records the first reason to
+// refuse it. White space between elements, comments and processing
+// instructions are skipped; a DTD is refused (no entity expansion from
+// clients). Once a structural refusal is recorded, finish() still reads to
+// the end so that a body that is not well-formed is reported as such.
+class XmlCursor
+{
+public:
+    explicit XmlCursor(const QString &text);
+
+    // Moves to the root element; false when there is none.
+    bool enterRoot();
+    // Moves to the next child element of the current one; false at the end
+    // of the current element or after a refusal.
+    bool nextChild();
+    QString name() const { return m_reader.qualifiedName().toString(); }
+    // The text of a leaf element, up to its end tag.
+    bool readText(QString *text);
+    // The element's content as canonical compact XML, up to its end tag:
+    // white space between elements, comments and processing instructions
+    // dropped, texts and attributes escaped again, empty-element tags kept.
+    bool copyContent(QString *xml);
+    // Reads the rest of the document; returns the first refusal, if any.
+    Refusal finish();
+
+    bool refuse(ServerCode code, const QString &reason);
+    bool refused() const { return m_refusal.refused(); }
+
+    // Readers of the common fields.
+    bool readInteger(qint64 *value);
+
+private:
+    bool xmlError();
+
+    QXmlStreamReader m_reader;
+    Refusal m_refusal;
+};

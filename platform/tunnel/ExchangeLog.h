@@ -1,0 +1,44 @@
+#pragma once
+
+#include <QString>
+
+#include <cstdio>
+#include <mutex>
+
+// One exchange as the log records it.
+struct ExchangeRecord
+{
+    quint64 seq = 0;
+    QString outcome; // answered, timeout, failed, code, dropped, shutdown, refused, late
+    QString command;
+    QString pluginId;
+    int kind = 0;
+    const void *identity = nullptr;
+    bool ownIdentity = false;
+    qint32 timeoutMs = 0;
+    bool flag = false;
+    QString body;
+    bool ok = false;
+    QString code;
+    QString content;
+    QString faults;
+    qint64 elapsedMs = 0;
+};
+
+// Appends one JSON object per line to a file; safe to call from any thread.
+class ExchangeLog
+{
+public:
+    ExchangeLog() = default;
+    ~ExchangeLog();
+    ExchangeLog(const ExchangeLog &) = delete;
+    ExchangeLog &operator=(const ExchangeLog &) = delete;
+
+    bool open(const QString &path, QString *error);
+    bool isOpen() const { return m_file != nullptr; }
+    void write(const ExchangeRecord &record);
+
+private:
+    std::mutex m_mutex;
+    std::FILE *m_file = nullptr;
+};
