@@ -110,7 +110,7 @@ TEST(PluginLifetime, TunnelAnswersPastDeletionAreEachAnsweredOnce)
     std::deque<ReplyRecorder> replies;
     for (const QString &command : ReadFirstCommands) {
         replies.emplace_back();
-        plugin->Request(command, QVariant(), RequestSenderInfo{}, replies.back().callback());
+        plugin->Request(command, ReadablePayload, RequestSenderInfo{}, replies.back().callback());
     }
     ASSERT_EQ(tunnel.pending(), ReadFirstCommands.size());
     plugin.reset();
