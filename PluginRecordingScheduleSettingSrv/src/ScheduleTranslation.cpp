@@ -11,6 +11,7 @@
 #include <QJsonArray>
 #include <QJsonDocument>
 
+#include <algorithm>
 #include <utility>
 #include <vector>
 
@@ -113,23 +114,13 @@ QString quotedMode(const QString &mode)
 std::vector<std::pair<qint64, qint64>> dayRuns(const QVariant &days)
 {
     std::vector<std::pair<qint64, qint64>> runs;
-    bool open = false;
-    qint64 start = 0;
-    qint64 last = 0;
     for (const QVariant &entry : entries(days)) {
         const qint64 day = dayNumber(entry.toMap().value(TimecardKey::AttrBegin));
-        if (open && day == last + 1) {
-            last = day;
-            continue;
-        }
-        if (open)
-            runs.emplace_back(start, last);
-        start = day - 1;
-        last = day;
-        open = true;
+        if (!runs.empty() && day == runs.back().second + 1)
+            runs.back().second = day;
+        else
+            runs.emplace_back(day - 1, day);
     }
-    if (open)
-        runs.emplace_back(start, last);
     return runs;
 }
 
@@ -146,7 +137,8 @@ QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &
     QString document = QStringLiteral("{\"Rectangles\":[");
     for (const QVariant &entry : mappings) {
         const VariantMap mapping = entry.toMap();
-        const QString mode = quotedMode(text(mapping.value(TimecardKey::RecMode)));
+        const QString modeText = text(mapping.value(TimecardKey::RecMode));
+        const QString mode = quotedMode(modeText);
         const VariantMap frame = mapping.value(TimecardKey::Frame).toMap();
 
         if (text(frame.value(TimecardKey::RepeatMod)) != TimecardKey::Weekly) {
@@ -164,10 +156,17 @@ QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &
             intervals.emplace_back(hoursText(number(bounds.value(TimecardKey::AttrBegin))),
                                    hoursText(number(bounds.value(TimecardKey::AttrEnd))));
         }
-        const QString triggers = text(mapping.value(TimecardKey::RecMode)) == RecordingMode::Event
-                                     ? ParseTriggerEvents(mapping)
-                                     : QString();
+        const QString triggers =
+            modeText == RecordingMode::Event ? ParseTriggerEvents(mapping) : QString();
 
+        // Grown ahead, doubling: a document of many event frames runs to tens
+        // of megabytes, and growing it rectangle by rectangle spends the time
+        // copying it.
+        const qsizetype perRectangle = 96 + mode.size() + triggers.size();
+        const qsizetype needed =
+            document.size() + qsizetype(runs.size() * intervals.size()) * perRectangle;
+        if (needed > document.capacity())
+            document.reserve(std::max(needed, 2 * document.capacity()));
         for (const auto &[left, right] : runs) {
             const QString leftText = QString::number(left);
             const QString rightText = QString::number(right);

@@ -132,6 +132,39 @@ TEST_F(PluginLoaderTest, LoadedPluginInitialisesAndAnswers)
     delete plugin;
 }
 
+TEST_F(PluginLoaderTest, LoadedPluginAnswersAQueryThroughTheTunnel)
+{
+    auto *const plugin = qobject_cast<IPluginObjectBase *>(loader.instance());
+    ASSERT_NE(plugin, nullptr);
+    TestTunnel tunnel;
+    Framework framework;
+    framework.tunnel = &tunnel;
+    ASSERT_TRUE(plugin->InitialPluginBase(&framework));
+    tunnel.queueAnswer(
+        {true, QStringLiteral("0"),
+         QStringLiteral("<GetRecTmcardRes><Tmcard><Revision>2</Revision><TmcardID>7"
+                        "</TmcardID><Name>KOLT2 Customize Recording</Name><Mapping>"
+                        "<Ele><Frame><RepeatMod>Weekly</RepeatMod><DayList><Ele "
+                        "B=\"6.0\"/></DayList><Intervals><Ele B=\"1800\" "
+                        "E=\"86400\"/></Intervals></Frame><RecMode>Continuous"
+                        "</RecMode></Ele></Mapping><CamList><Cam><Name>C_4</Name>"
+                        "<GrpID>2</GrpID></Cam></CamList></Tmcard></GetRecTmcardRes>"),
+         false});
+
+    QVariant data;
+    plugin->Request(
+        QStringLiteral("GetScheduleRecInfo"), QVariant(), RequestSenderInfo{},
+        [&](bool, const QString &, const QString &, const QVariant &value) { data = value; });
+    EXPECT_EQ(tunnel.commands(), QStringList{QStringLiteral("GetRecTmcard")});
+    EXPECT_EQ(data.toMap(),
+              (QVariantMap{{QStringLiteral("RecScheduleType"), 2},
+                           {QStringLiteral("CustomizeContent"),
+                            QStringLiteral("{\"Rectangles\":[{\"Bottom\":24,\"Left\":5,"
+                                           "\"RecordingMode\":\"Continuous\",\"Right\":6,"
+                                           "\"Top\":0.5}]}")}}));
+    delete plugin;
+}
+
 TEST_F(PluginLoaderTest, DeletedInstanceIsMadeAgain)
 {
     delete loader.instance();

@@ -36,24 +36,14 @@ std::optional<QByteArray> readInput(const QString &fileName, QString *error)
     return file.readAll();
 }
 
-// Loads the plug-in, starts the server and hands it the tunnel; the exit
-// status of the first step that fails.
-int startPlatform(HostPlatform &platform)
-{
-    QString error;
-    if (!platform.loadPlugin(&error) || !platform.startTunnel(&error) ||
-        !platform.initialisePlugin(&error)) {
-        printError(error);
-        return ExitUsage;
-    }
-    return ExitOk;
-}
-
 int runRequests(const HostOptions &options, const std::vector<HostRequest> &requests)
 {
     HostPlatform platform(options);
-    if (const int status = startPlatform(platform); status != ExitOk)
-        return status;
+    QString error;
+    if (!platform.start(&error)) {
+        printError(error);
+        return ExitUsage;
+    }
     RequestRunner runner(platform);
     runner.run(requests);
     return runner.finish();

@@ -71,6 +71,11 @@ bool HostPlatform::initialisePlugin(QString *error)
     return false;
 }
 
+bool HostPlatform::start(QString *error)
+{
+    return loadPlugin(error) && startTunnel(error) && initialisePlugin(error);
+}
+
 IPluginObjectBase *HostPlatform::plugin() const
 {
     return m_library ? m_library->plugin() : nullptr;

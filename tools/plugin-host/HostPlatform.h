@@ -34,6 +34,8 @@ public:
     bool startTunnel(QString *error);
     // Hands the plug-in the framework with the tunnel.
     bool initialisePlugin(QString *error);
+    // The three steps above, in order, up to the first that fails.
+    bool start(QString *error);
 
     IPluginObjectBase *plugin() const;
     // The tunnel as the plug-in sees it: every exchange is counted.

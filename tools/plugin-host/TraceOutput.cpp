@@ -4,6 +4,6 @@
 
 void sendTraceToStandardError(int level)
 {
-    qputenv("QIRNLOG_FILE", QByteArrayLiteral("-"));
+    qputenv("QIRNLOG_FILE", QByteArrayLiteral("stderr"));
     qputenv("QIRNLOG_LEVEL", QByteArray::number(level));
 }
