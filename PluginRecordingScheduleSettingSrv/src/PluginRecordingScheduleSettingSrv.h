@@ -119,6 +119,28 @@ private:
                                         QList<QVariant> cameras, QList<int> timecardIds,
                                         ResponseCallback reply);
 
+    // Steps the workflows share.
+    static bool ReadTimecardId(const QString &text, int *timecardId);
+    static bool TimeframesReadable(const QString &content);
+    ControlResultCallback ReplyCompletion(const ResponseCallback &reply);
+    ControlResultCallback CameraStepCompletion(const VariantMap &remaining,
+                                               const ResponseCallback &reply);
+    TimecardListCallback ChangeCamerasAfterRead(bool removing, const QList<QVariant> &cameras,
+                                                const VariantMap &remaining,
+                                                const ResponseCallback &reply);
+    void AddCamerasToFixedTimecard(bool ok, const QList<QVariant> &timecards,
+                                   const QString &type, const QList<QVariant> &cameras,
+                                   const VariantMap &remaining, ResponseCallback reply);
+    QList<int> TimecardIDThatHoldsAnyCamera(const QList<QVariant> &timecards,
+                                            const QList<QVariant> &cameras,
+                                            const VariantMap &except) const;
+    void RemoveCamerasFromTimecards(QList<int> timecardIds, const QString &type,
+                                    const QString &content, const QList<QVariant> &cameras,
+                                    ResponseCallback reply);
+    void PutCamerasOnFixedTimecard(const VariantMap &summary, const QString &type,
+                                   const QString &content, const QList<QVariant> &cameras,
+                                   ResponseCallback reply);
+
     // Guards m_control and every completion; see PluginLifetime.
     std::shared_ptr<PluginLifetime> m_lifetime;
     QSharedPointer<IRecordingSettingControl> m_control;

@@ -52,7 +52,12 @@ void PluginRecordingScheduleSettingSrv::Request(const QString &command, const QV
                                     QString(), cameras, reply);
         }));
     } else if (command == Command::CustomizeSchedule) {
-        assignDefault(ScheduleTypeWord::Customize, map.value(PayloadKey::Timeframes).toString());
+        const QString content = map.value(PayloadKey::Timeframes).toString();
+        // An unreadable document would wipe the customised time frames.
+        if (TimeframesReadable(content))
+            assignDefault(ScheduleTypeWord::Customize, content);
+        else
+            ReplyFailure(reply);
     } else if (command == Command::GetScheduleRecInfo) {
         readAll(Guard(reply, [this, reply](bool ok, bool flag, const QList<QVariant> &timecards,
                                            const QString &) {

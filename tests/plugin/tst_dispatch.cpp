@@ -31,6 +31,11 @@ RequestSenderInfo sender(quintptr id)
     return info;
 }
 
+// "CustomizeSchedule" answers at once, before any read, when its schedule
+// document is missing or unreadable; the other commands ignore the key.
+const QVariant ReadablePayload =
+    QVariantMap{{QStringLiteral("timeframes"), QStringLiteral("{\"Rectangles\":[]}")}};
+
 const QStringList ReadFirstCommands{
     QStringLiteral("DefaultContinousSchedule"),    QStringLiteral("DefaultEventSchedule"),
     QStringLiteral("DefaultNotRecordingSchedule"), QStringLiteral("CustomizeSchedule"),
@@ -98,7 +103,7 @@ TEST_P(Routing, StartsTheCommandOrAnswersItAtOnce)
     const Route &route = GetParam();
     control->setFetch(FakeControl::Fetch::Hold);
     ReplyRecorder reply;
-    plugin.Request(route.command, QVariant(), sender(0x42), reply.callback());
+    plugin.Request(route.command, ReadablePayload, sender(0x42), reply.callback());
 
     EXPECT_EQ(control->clientIds(), QList<void *>{reinterpret_cast<void *>(0x42)});
     EXPECT_EQ(control->operations().contains(QStringLiteral("GetAllScheduleTimecardInfo")),

@@ -20,6 +20,11 @@
 
 namespace {
 
+// "CustomizeSchedule" answers at once, before any read, when its schedule
+// document is missing or unreadable; the other commands ignore the key.
+const QVariant ReadablePayload =
+    QVariantMap{{QStringLiteral("timeframes"), QStringLiteral("{\"Rectangles\":[]}")}};
+
 const QStringList ReadFirstCommands{
     QStringLiteral("DefaultContinousSchedule"),    QStringLiteral("DefaultEventSchedule"),
     QStringLiteral("DefaultNotRecordingSchedule"), QStringLiteral("CustomizeSchedule"),
@@ -38,7 +43,7 @@ TEST(PluginLifetime, AnswersHeldPastDeletionAreEachAnsweredOnce)
     std::deque<ReplyRecorder> replies;
     for (const QString &command : ReadFirstCommands) {
         replies.emplace_back();
-        plugin->Request(command, QVariant(), RequestSenderInfo{}, replies.back().callback());
+        plugin->Request(command, ReadablePayload, RequestSenderInfo{}, replies.back().callback());
     }
     ASSERT_EQ(control->held(), ReadFirstCommands.size());
     plugin.reset();
@@ -105,7 +110,7 @@ TEST(PluginLifetime, TunnelAnswersPastDeletionAreEachAnsweredOnce)
     std::deque<ReplyRecorder> replies;
     for (const QString &command : ReadFirstCommands) {
         replies.emplace_back();
-        plugin->Request(command, QVariant(), RequestSenderInfo{}, replies.back().callback());
+        plugin->Request(command, ReadablePayload, RequestSenderInfo{}, replies.back().callback());
     }
     ASSERT_EQ(tunnel.pending(), ReadFirstCommands.size());
     plugin.reset();
