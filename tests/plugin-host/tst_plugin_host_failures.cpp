@@ -98,7 +98,7 @@ INSTANTIATE_TEST_SUITE_P(
                   {QStringLiteral("--answer-layout"), QStringLiteral("pretty"),
                    QStringLiteral("request"), QStringLiteral("GetScheduleRecInfo")},
                   "--answer-layout"},
-        UsageCase{"fault_specification_that_does_not_parse",
+        UsageCase{"fault_list_that_does_not_parse",
                   {QStringLiteral("--faults"), QStringLiteral("slow"), QStringLiteral("request"),
                    QStringLiteral("GetScheduleRecInfo")},
                   "--faults"}),
