@@ -157,6 +157,88 @@ TEST_F(LateServer, RawExchangeWaitsAsLongAsTheReplyTimeOut)
     EXPECT_EQ(cards().size(), 3);
 }
 
+// A plug-in that replies twice, never or by throwing: plugin-host tells,
+// with status 3, instead of printing as if all were well.
+class BrokenPlugin : public HostProcess
+{
+protected:
+    Run misbehaving(const QStringList &arguments, const QByteArray &input = {})
+    {
+        return host(
+            QStringList{QStringLiteral("--plugin"), QStringLiteral(MISBEHAVING_PLUGIN_FILE)} +
+                arguments,
+            input);
+    }
+};
+
+struct EchoCase
+{
+    const char *name;
+    const char *payload; // null: none
+    QByteArray data;
+};
+
+void PrintTo(const EchoCase &c, std::ostream *os)
+{
+    *os << c.name;
+}
+
+class Echo : public BrokenPlugin, public testing::WithParamInterface<EchoCase>
+{};
+
+TEST_P(Echo, PayloadReachesThePluginAsAnyJsonValue)
+{
+    QStringList arguments{QStringLiteral("request"), QStringLiteral("Echo")};
+    if (GetParam().payload)
+        arguments << QString::fromUtf8(GetParam().payload);
+    const Run run = misbehaving(arguments);
+    EXPECT_EQ(run.status, 0) << run.err.toStdString();
+    EXPECT_EQ(run.out, R"({"command": "Echo", "flag": true, "code": "0", "text": "", "data": )" +
+                           GetParam().data + "}\n");
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Payloads, Echo,
+    testing::Values(EchoCase{"absent_is_no_payload", nullptr, "null"},
+                    EchoCase{"null", "null", "null"},
+                    EchoCase{"negative_number_is_no_option", "-1", "-1"},
+                    EchoCase{"string", R"("Lobby \u00e9")", "\"Lobby \xc3\xa9\""},
+                    EchoCase{"nested_object", R"({"b": [1, 2.5, "x", null, true], "a": {}})",
+                             R"({"a":{},"b":[1,2.5,"x",null,true]})"},
+                    EchoCase{"empty_array", "[]", "[]"}),
+    [](const testing::TestParamInfo<EchoCase> &info) { return std::string(info.param.name); });
+
+TEST_F(BrokenPlugin, SecondReplyEndsWithStatusThree)
+{
+    const Run run =
+        misbehaving({QStringLiteral("request"), QStringLiteral("Twice"), QStringLiteral("1")});
+    EXPECT_EQ(run.status, 3);
+    EXPECT_EQ(run.lines().size(), 1);
+    EXPECT_TRUE(run.err.contains("request 1 (Twice): 2 replies")) << run.err.toStdString();
+}
+
+TEST_F(BrokenPlugin, MissingReplyStopsTheSession)
+{
+    const Run run = misbehaving(
+        {QStringLiteral("--reply-timeout"), QStringLiteral("200"), QStringLiteral("session")},
+        "{\"command\": \"Echo\"}\n{\"command\": \"Never\"}\n{\"command\": \"Echo\"}\n");
+    EXPECT_EQ(run.status, 3);
+    EXPECT_EQ(run.lines().size(), 1);
+    EXPECT_TRUE(run.err.contains("request 2 (Never): no reply within 200 ms"))
+        << run.err.toStdString();
+    EXPECT_TRUE(run.err.contains("1 later request(s) not sent")) << run.err.toStdString();
+}
+
+TEST_F(BrokenPlugin, ThrowingPluginDoesNotTakeTheHostDown)
+{
+    const Run run = misbehaving({QStringLiteral("--reply-timeout"), QStringLiteral("200"),
+                                 QStringLiteral("request"), QStringLiteral("Throw")});
+    EXPECT_EQ(run.status, 3);
+    EXPECT_EQ(run.out, QByteArray());
+    EXPECT_TRUE(run.err.contains("request 1 (Throw): the plug-in threw: thrown on purpose"))
+        << run.err.toStdString();
+}
+
 } // namespace
 
 int main(int argc, char **argv)

@@ -153,6 +153,38 @@ TEST_F(Options, ReadmeSessionPrintsWhatTheReadmeShows)
     EXPECT_TRUE(readme.contains(raw.out.trimmed())) << raw.out.toStdString();
 }
 
+// The README's main job: the story runs through on a fresh server of its
+// own, every command succeeds, and the schedules it changed are drawn.
+TEST_F(Options, DemoTellsItsStoryAndEndsWithStatusZero)
+{
+    seed();
+    const QStringList before = cards();
+    const Run run = bare({QStringLiteral("--db"), database(), QStringLiteral("demo")});
+    EXPECT_EQ(run.status, 0) << run.err.toStdString();
+    EXPECT_EQ(run.err, QByteArray());
+    QStringList commands;
+    for (const QByteArray &line : run.lines()) {
+        if (!line.startsWith("< "))
+            continue;
+        commands << QString::fromUtf8(line.mid(2).split('"').value(3));
+        EXPECT_TRUE(line.contains(R"("code": "0")")) << line.toStdString();
+    }
+    EXPECT_EQ(
+        commands,
+        (QStringList{QStringLiteral("AddSchedule"), QStringLiteral("DefaultEventSchedule"),
+                     QStringLiteral("UpdateCamRecSchedule"), QStringLiteral("GetScheduleRecInfo"),
+                     QStringLiteral("DefaultNotRecordingSchedule"),
+                     QStringLiteral("GetScheduleRecInfo")}));
+    EXPECT_TRUE(run.out.contains("Time card 2 \"Lobby\" (revision 1, new), cameras: none\n"
+                                 "             1  2  3  4  5  6  7\n"
+                                 "    00:00    .  .  .  .  .  E  E\n"));
+    EXPECT_TRUE(run.out.contains("    08:00    C  C  C  C  C  E  E\n"));
+    EXPECT_TRUE(run.out.contains("cameras: C_1 (group 1), C_2 (group 1), C_3 (group 2)\n"));
+    EXPECT_TRUE(run.out.endsWith("Every request got exactly one reply.\n"));
+    // The demo's server is a temporary one: --db is left alone.
+    EXPECT_EQ(cards(), before);
+}
+
 } // namespace
 
 int main(int argc, char **argv)

@@ -48,7 +48,8 @@ Commands:
   raw COMMAND BODY        send one XML message to the server through the
                           tunnel, bypassing the plug-in; prints
                           {"ok": B, "code": C, "content": XML}
-  demo                    a short, explained session against a fresh server
+  demo                    a short, explained session against a fresh,
+                          temporary server (--db does not apply)
 
 Each reply is one JSON line on standard output:
   {"command": NAME, "flag": B, "code": "0"|"-1", "text": T, "data": D}

@@ -65,7 +65,7 @@ bool openServer(const HostOptions &options, RecordingServer **server,
     *holder = std::make_unique<RecordingServer>(database, layout);
     QString error;
     if (!(*holder)->open(&error)) {
-        printError(QStringLiteral("%1: %2").arg(database, error));
+        printError(QStringLiteral("the server's database does not open: %1").arg(error));
         return false;
     }
     *server = holder->get();
