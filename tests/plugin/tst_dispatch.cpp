@@ -7,6 +7,7 @@
 #include "QtPrinters.h"
 #include "ReplyRecorder.h"
 #include "RequestSenderInfo.h"
+#include "TestLog.h"
 #include "TestTunnel.h"
 
 #include "IFrameworkTools.h"
@@ -153,6 +154,104 @@ INSTANTIATE_TEST_SUITE_P(
         Route{"EmptyCommandIsUnknown", QString(), false, true},
         Route{"ScheduleTypeWordIsNoCommand", QStringLiteral("Customize"), false, true},
         Route{"TunnelCommandIsNoClientCommand", QStringLiteral("GetRecTmcard"), false, true}),
+    [](const auto &info) { return std::string(info.param.name); });
+
+// What the dispatcher binds into the completion of its read: the handler it
+// reaches and the payload values it hands on, seen through the first control
+// operation that handler makes once the time cards have arrived.
+struct Binding
+{
+    const char *name;
+    QString command;
+    QVariantMap payload;
+    QList<QVariant> timecards;
+    QStringList operationsAfterRead;
+    QList<QVariant> lastArguments;
+    QString failedReadRecord; // the error line when the read fails instead
+};
+
+void PrintTo(const Binding &binding, std::ostream *os)
+{
+    *os << binding.name;
+}
+
+class Bindings : public DispatchTest, public ::testing::WithParamInterface<Binding>
+{};
+
+TEST_P(Bindings, ReachTheHandlerWithThePayloadValues)
+{
+    const Binding &binding = GetParam();
+    control->setAnswer({true, false, binding.timecards, QStringLiteral("<GetRecTmcardRes/>")});
+    ReplyRecorder reply;
+    plugin.Request(binding.command, binding.payload, sender(1), reply.callback());
+    const QList<FakeControl::Call> calls = control->calls();
+    EXPECT_EQ(control->operations(), QStringList{QStringLiteral("GetAllScheduleTimecardInfo")} +
+                                         binding.operationsAfterRead);
+    EXPECT_EQ(calls.constLast().arguments, binding.lastArguments);
+    EXPECT_EQ(reply.count(), 1) << "the refused send is answered";
+}
+
+TEST_P(Bindings, FailedReadIsReportedByThatHandler)
+{
+    TestLog log;
+    log.attach();
+    control->setAnswer({false, false, {}, {}});
+    ReplyRecorder reply;
+    plugin.Request(GetParam().command, GetParam().payload, sender(1), reply.callback());
+    ASSERT_EQ(reply.count(), 1);
+    EXPECT_FALSE(reply.last().flag) << "the read's own flag";
+    EXPECT_EQ(reply.last().code, QStringLiteral("-1"));
+    EXPECT_EQ(log.texts(2), QStringList{GetParam().failedReadRecord});
+}
+
+const QVariantMap Camera{{QStringLiteral("Name"), QStringLiteral("C_4")},
+                         {QStringLiteral("GrpID"), QStringLiteral("2")}};
+const QVariantMap WithCameras{{QStringLiteral("camRecGroupList"), QVariantList{Camera}}};
+const QString Document = QStringLiteral("{\"Rectangles\":[]}");
+const QVariantMap Timecard7{{QStringLiteral("TmcardID"), QStringLiteral("7")},
+                            {QStringLiteral("Revision"), QStringLiteral("4")}};
+const QString ListFailed = QStringLiteral("Fail to get time card list.");
+const QString AllFailed = QStringLiteral("Fail to get all schedule time card.");
+
+INSTANTIATE_TEST_SUITE_P(
+    Dispatch, Bindings,
+    ::testing::Values(
+        Binding{"DefaultContinousScheduleCreatesTheContinuousTimecard",
+                QStringLiteral("DefaultContinousSchedule"),
+                WithCameras,
+                {},
+                {"GetDefaultContinousTimecardInfo", "CreateDefaultContinuousTimecard"},
+                {QVariantList{Camera}},
+                ListFailed},
+        Binding{"DefaultEventScheduleCreatesTheEventTimecard",
+                QStringLiteral("DefaultEventSchedule"),
+                WithCameras,
+                {},
+                {"GetDefaultEventTimecardInfo", "CreateDefaultEventTimecard"},
+                {QVariantList{Camera}},
+                ListFailed},
+        Binding{"CustomizeScheduleHandsOnItsDocument",
+                QStringLiteral("CustomizeSchedule"),
+                {{QStringLiteral("timeframes"), Document},
+                 {QStringLiteral("camRecGroupList"), QVariantList{Camera}}},
+                {},
+                {"GetCustomizeTimecardInfo", "CreateCustomizeTimecard"},
+                {Document, QVariantList{Camera}},
+                ListFailed},
+        Binding{"DefaultNotRecordingScheduleClearsTheDefaultTimecard",
+                QStringLiteral("DefaultNotRecordingSchedule"),
+                WithCameras,
+                {},
+                {"RemoveTimecardCameraList"},
+                {1, QVariantList{Camera}},
+                AllFailed},
+        Binding{"DelScheduleDeletesTheNamedTimecard",
+                QStringLiteral("DelSchedule"),
+                {{QStringLiteral("TimeCardID"), QStringLiteral("7")}},
+                {QVariantMap{{QStringLiteral("TmcardID"), QStringLiteral("3")}}, Timecard7},
+                {"DeleteSchedule"},
+                {Timecard7},
+                AllFailed}),
     [](const auto &info) { return std::string(info.param.name); });
 
 TEST_F(DispatchTest, ClientIdentityIsReplacedOnEveryRequestWhateverTheCommand)
