@@ -36,6 +36,26 @@ bool XmlCursor::xmlError()
     return false;
 }
 
+QXmlStreamReader::TokenType XmlCursor::nextToken()
+{
+    if (m_reader.atEnd()) {
+        xmlError();
+        return QXmlStreamReader::NoToken;
+    }
+    const QXmlStreamReader::TokenType token = m_reader.readNext();
+    switch (token) {
+    case QXmlStreamReader::Invalid:
+        xmlError();
+        return QXmlStreamReader::NoToken;
+    case QXmlStreamReader::EntityReference:
+    case QXmlStreamReader::DTD:
+        refuse(ServerCode::MalformedXml, QStringLiteral("unexpected markup"));
+        return QXmlStreamReader::NoToken;
+    default:
+        return token;
+    }
+}
+
 bool XmlCursor::enterRoot()
 {
     while (!m_reader.atEnd()) {
@@ -62,8 +82,10 @@ bool XmlCursor::nextChild()
 {
     if (refused())
         return false;
-    while (!m_reader.atEnd()) {
-        switch (m_reader.readNext()) {
+    for (;;) {
+        switch (nextToken()) {
+        case QXmlStreamReader::NoToken:
+            return false;
         case QXmlStreamReader::StartElement:
             return true;
         case QXmlStreamReader::EndElement:
@@ -74,24 +96,20 @@ bool XmlCursor::nextChild()
                               QStringLiteral("unexpected text \"%1\"")
                                   .arg(m_reader.text().left(40).toString()));
             break;
-        case QXmlStreamReader::Invalid:
-            return xmlError();
-        case QXmlStreamReader::EntityReference:
-        case QXmlStreamReader::DTD:
-            return refuse(ServerCode::MalformedXml, QStringLiteral("unexpected markup"));
         default:
             break;
         }
     }
-    return xmlError();
 }
 
 bool XmlCursor::readText(QString *text)
 {
     text->clear();
     const QString element = name();
-    while (!m_reader.atEnd()) {
-        switch (m_reader.readNext()) {
+    for (;;) {
+        switch (nextToken()) {
+        case QXmlStreamReader::NoToken:
+            return false;
         case QXmlStreamReader::Characters:
             *text += m_reader.text();
             break;
@@ -100,16 +118,10 @@ bool XmlCursor::readText(QString *text)
         case QXmlStreamReader::StartElement:
             return refuse(ServerCode::BadStructure,
                           QStringLiteral("<%1> inside <%2>").arg(name(), element));
-        case QXmlStreamReader::Invalid:
-            return xmlError();
-        case QXmlStreamReader::EntityReference:
-        case QXmlStreamReader::DTD:
-            return refuse(ServerCode::MalformedXml, QStringLiteral("unexpected markup"));
         default:
             break;
         }
     }
-    return xmlError();
 }
 
 bool XmlCursor::readInteger(qint64 *value)
@@ -158,8 +170,10 @@ bool XmlCursor::copyContent(QString *xml)
         pendingText.clear();
     };
 
-    while (!m_reader.atEnd()) {
-        switch (m_reader.readNext()) {
+    for (;;) {
+        switch (nextToken()) {
+        case QXmlStreamReader::NoToken:
+            return false;
         case QXmlStreamReader::StartElement:
             flushStart();
             flushText(false);
@@ -186,16 +200,10 @@ bool XmlCursor::copyContent(QString *xml)
             flushStart();
             pendingText += m_reader.text();
             break;
-        case QXmlStreamReader::Invalid:
-            return xmlError();
-        case QXmlStreamReader::EntityReference:
-        case QXmlStreamReader::DTD:
-            return refuse(ServerCode::MalformedXml, QStringLiteral("unexpected markup"));
         default:
             break;
         }
     }
-    return xmlError();
 }
 
 Refusal XmlCursor::finish()

@@ -39,6 +39,9 @@ public:
 
 private:
     bool xmlError();
+    // The next token below the root; NoToken, with the refusal recorded, at
+    // the end of the body, on a syntax error or on entity and DTD markup.
+    QXmlStreamReader::TokenType nextToken();
 
     QXmlStreamReader m_reader;
     Refusal m_refusal;

@@ -3,6 +3,7 @@
 // handed on with every request.
 
 #include "FakeControl.h"
+#include "PluginCommands.h"
 #include "PluginRecordingScheduleSettingSrv.h"
 #include "QtPrinters.h"
 #include "ReplyRecorder.h"
@@ -32,17 +33,6 @@ RequestSenderInfo sender(quintptr id)
     return info;
 }
 
-// "CustomizeSchedule" answers at once, before any read, when its schedule
-// document is missing or unreadable; the other commands ignore the key.
-const QVariant ReadablePayload =
-    QVariantMap{{QStringLiteral("timeframes"), QStringLiteral("{\"Rectangles\":[]}")}};
-
-const QStringList ReadFirstCommands{
-    QStringLiteral("DefaultContinousSchedule"),    QStringLiteral("DefaultEventSchedule"),
-    QStringLiteral("DefaultNotRecordingSchedule"), QStringLiteral("CustomizeSchedule"),
-    QStringLiteral("GetScheduleRecInfo"),          QStringLiteral("GetCurrentScheduleInfo"),
-    QStringLiteral("GetAllScheduleRecInfo"),       QStringLiteral("DelSchedule"),
-};
 const QStringList HandlerCommands{QStringLiteral("AddSchedule"), QStringLiteral("UpdateSchedule"),
                                   QStringLiteral("UpdateCamRecSchedule")};
 

@@ -4,6 +4,7 @@
 // deleted object.
 
 #include "FakeControl.h"
+#include "PluginCommands.h"
 #include "PluginRecordingScheduleSettingSrv.h"
 #include "QtPrinters.h"
 #include "ReplyRecorder.h"
@@ -19,18 +20,6 @@
 #include <thread>
 
 namespace {
-
-// "CustomizeSchedule" answers at once, before any read, when its schedule
-// document is missing or unreadable; the other commands ignore the key.
-const QVariant ReadablePayload =
-    QVariantMap{{QStringLiteral("timeframes"), QStringLiteral("{\"Rectangles\":[]}")}};
-
-const QStringList ReadFirstCommands{
-    QStringLiteral("DefaultContinousSchedule"),    QStringLiteral("DefaultEventSchedule"),
-    QStringLiteral("DefaultNotRecordingSchedule"), QStringLiteral("CustomizeSchedule"),
-    QStringLiteral("GetScheduleRecInfo"),          QStringLiteral("GetCurrentScheduleInfo"),
-    QStringLiteral("GetAllScheduleRecInfo"),       QStringLiteral("DelSchedule"),
-};
 
 TEST(PluginLifetime, AnswersHeldPastDeletionAreEachAnsweredOnce)
 {

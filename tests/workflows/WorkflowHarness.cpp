@@ -4,33 +4,7 @@
 
 #include <gtest/gtest.h>
 
-#include <chrono>
-
-ResponseCallback ReplyLog::callback()
-{
-    return [this](bool flag, const QString &code, const QString &text, const QVariant &data) {
-        {
-            const std::lock_guard<std::mutex> lock(m_mutex);
-            m_replies.push_back(Reply{flag, code, text, data});
-        }
-        m_arrived.notify_all();
-    };
-}
-
-std::vector<ReplyLog::Reply> ReplyLog::replies() const
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    return m_replies;
-}
-
-bool ReplyLog::waitFor(size_t n, int timeoutMs) const
-{
-    std::unique_lock<std::mutex> lock(m_mutex);
-    return m_arrived.wait_for(lock, std::chrono::milliseconds(timeoutMs),
-                              [&] { return m_replies.size() >= n; });
-}
-
-void ExpectOneReply(const ReplyLog &log, bool flag, const QString &code, const QVariant &data)
+void ExpectOneReply(const ReplyRecorder &log, bool flag, const QString &code, const QVariant &data)
 {
     const auto replies = log.replies();
     ASSERT_EQ(replies.size(), 1u);

@@ -3,44 +3,18 @@
 #include "FakeRecordingServer.h"
 #include "IFrameworkTools.h"
 #include "PluginRecordingScheduleSettingSrv.h"
-#include "ResponseCallback.h"
+#include "ReplyRecorder.h"
 #include "TestTunnel.h"
 
 #include <QVariantMap>
 
-#include <condition_variable>
 #include <memory>
-#include <mutex>
 #include <ostream>
 #include <string>
 #include <vector>
 
-// Every reply a test's requests received, in order. Replies may arrive on the
-// tunnel's thread.
-class ReplyLog
-{
-public:
-    struct Reply
-    {
-        bool flag = false;
-        QString code;
-        QString text;
-        QVariant data;
-    };
-
-    ResponseCallback callback();
-    std::vector<Reply> replies() const;
-    // Waits until n replies have arrived; false on time-out.
-    bool waitFor(size_t n, int timeoutMs = 10000) const;
-
-private:
-    mutable std::mutex m_mutex;
-    mutable std::condition_variable m_arrived;
-    std::vector<Reply> m_replies;
-};
-
 // Asserts that exactly one reply arrived, and what it says.
-void ExpectOneReply(const ReplyLog &log, bool flag, const QString &code,
+void ExpectOneReply(const ReplyRecorder &log, bool flag, const QString &code,
                     const QVariant &data = QVariant());
 
 // One message as the tunnel took it.
@@ -70,7 +44,7 @@ public:
     // Declared so that the tunnel, which answers what it still holds when it
     // goes, goes before the server and the replies.
     FakeRecordingServer server;
-    ReplyLog replies;
+    ReplyRecorder replies;
     TestTunnel tunnel;
     std::unique_ptr<PluginRecordingScheduleSettingSrv> plugin;
 

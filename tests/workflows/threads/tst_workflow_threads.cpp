@@ -147,17 +147,18 @@ void runRequesters(std::vector<std::unique_ptr<Site>> &sites, ReplyCounter &coun
         requester.join();
 }
 
-TEST(WorkflowThreads, EveryRequestGetsExactlyOneReply)
+std::vector<std::unique_ptr<Site>> makeSites(FakeRecordingServer &server)
 {
-    FakeRecordingServer server;
-    seed(server);
-    ReplyCounter counter;
     std::vector<std::unique_ptr<Site>> sites;
     for (int p = 0; p < Plugins; ++p)
         sites.push_back(std::make_unique<Site>(server));
+    return sites;
+}
 
-    runRequesters(sites, counter);
-
+// Once every request has its reply and the tunnels are quiet, no request may
+// have had a second one.
+void expectEachAnsweredOnce(const std::vector<std::unique_ptr<Site>> &sites, ReplyCounter &counter)
+{
     ASSERT_TRUE(counter.waitForAll(Requests));
     for (const auto &site : sites)
         site->tunnel.waitIdle();
@@ -165,24 +166,30 @@ TEST(WorkflowThreads, EveryRequestGetsExactlyOneReply)
         EXPECT_EQ(counter.count(n), 1) << "request " << n << " " << command(n).first.toStdString();
 }
 
+TEST(WorkflowThreads, EveryRequestGetsExactlyOneReply)
+{
+    FakeRecordingServer server;
+    seed(server);
+    ReplyCounter counter;
+    std::vector<std::unique_ptr<Site>> sites = makeSites(server);
+
+    runRequesters(sites, counter);
+
+    expectEachAnsweredOnce(sites, counter);
+}
+
 TEST(WorkflowThreads, PluginsDeletedWithAnswersOnTheirWayStillAnswerEveryRequest)
 {
     FakeRecordingServer server;
     seed(server);
     ReplyCounter counter;
-    std::vector<std::unique_ptr<Site>> sites;
-    for (int p = 0; p < Plugins; ++p)
-        sites.push_back(std::make_unique<Site>(server));
+    std::vector<std::unique_ptr<Site>> sites = makeSites(server);
 
     runRequesters(sites, counter);
     for (const auto &site : sites)
         site->plugin.reset();
 
-    ASSERT_TRUE(counter.waitForAll(Requests));
-    for (const auto &site : sites)
-        site->tunnel.waitIdle();
-    for (int n = 0; n < Requests; ++n)
-        EXPECT_EQ(counter.count(n), 1) << "request " << n << " " << command(n).first.toStdString();
+    expectEachAnsweredOnce(sites, counter);
 }
 
 } // namespace
