@@ -4,6 +4,13 @@
 // sender: the return of SendRequest, the handler's values and whether the
 // server was asked at all.
 
+LocalTunnelOptions withFaults(const QString &faults)
+{
+    LocalTunnelOptions options;
+    options.faults = faults;
+    return options;
+}
+
 struct FaultRow
 {
     const char *behaviour;
@@ -22,9 +29,7 @@ TEST_P(InjectedFaults, HitTheRequestsTheySelect)
 {
     EchoBackend backend;
     Deliveries deliveries;
-    LocalTunnelOptions options;
-    options.faults = QString::fromUtf8(GetParam().faults);
-    LocalTunnel tunnel(backend.factory(), options);
+    LocalTunnel tunnel(backend.factory(), withFaults(QString::fromUtf8(GetParam().faults)));
     ASSERT_TRUE(tunnel.IsConnected()) << tunnel.errorString().toStdString();
     std::string outcomes;
     for (int i = 1; i <= 4; ++i) {
@@ -65,9 +70,7 @@ TEST(InjectedFaults, ReorderHoldsAnAnswerUntilALaterOneWentOut)
 {
     EchoBackend backend;
     Deliveries deliveries;
-    LocalTunnelOptions options;
-    options.faults = QStringLiteral("reorder@2");
-    LocalTunnel tunnel(backend.factory(), options);
+    LocalTunnel tunnel(backend.factory(), withFaults(QStringLiteral("reorder@2")));
     ASSERT_TRUE(send(tunnel, QStringLiteral("Wait"), QString(), deliveries.handler(1)));
     backend.gate.waitUntilReached();
     for (int i = 2; i <= 4; ++i)
@@ -86,9 +89,7 @@ TEST(InjectedFaults, HeldAnswerGoesOutWhenNothingElseIsPending)
 {
     EchoBackend backend;
     Deliveries deliveries;
-    LocalTunnelOptions options;
-    options.faults = QStringLiteral("reorder");
-    LocalTunnel tunnel(backend.factory(), options);
+    LocalTunnel tunnel(backend.factory(), withFaults(QStringLiteral("reorder")));
     ASSERT_TRUE(send(tunnel, QStringLiteral("X"), QString(), deliveries.handler(1)));
     deliveries.waitFor(1);
     EXPECT_TRUE(deliveries.calls().front().ok);
@@ -99,8 +100,8 @@ std::string runSeeded(quint64 seed)
 {
     EchoBackend backend;
     Deliveries deliveries;
-    LocalTunnelOptions options;
-    options.faults = QStringLiteral("refuse=0.2,fail=0.2,code=0.2:5,drop=0.1,latency=0-3ms");
+    LocalTunnelOptions options =
+        withFaults(QStringLiteral("refuse=0.2,fail=0.2,code=0.2:5,drop=0.1,latency=0-3ms"));
     options.faultSeed = seed;
     LocalTunnel tunnel(backend.factory(), options);
     std::string outcomes;
@@ -141,10 +142,8 @@ TEST_P(FaultSpecifications, AreCheckedBeforeUse)
               GetParam().valid)
         << error.toStdString();
     EXPECT_EQ(error.isEmpty(), GetParam().valid);
-    LocalTunnelOptions options;
-    options.faults = QString::fromUtf8(GetParam().text);
     EchoBackend backend;
-    const LocalTunnel tunnel(backend.factory(), options);
+    const LocalTunnel tunnel(backend.factory(), withFaults(QString::fromUtf8(GetParam().text)));
     EXPECT_EQ(tunnel.IsConnected(), GetParam().valid)
         << "a bad specification leaves it disconnected";
 }
