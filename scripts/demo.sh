@@ -1,12 +1,10 @@
 #!/usr/bin/env bash
-# Installs what is missing, builds, and runs the demonstration session.
+# Installs what is missing, builds plugin-host with the plug-in and the
+# trace-log library, and runs the demonstration session.
 set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 cd "$root"
 scripts/setup.sh
-scripts/build.sh build
-if [ -x build/bin/plugin-host ]; then
-    build/bin/plugin-host demo
-else
-    ctest --test-dir build --output-on-failure
-fi
+cmake -S . -B build -DCMAKE_BUILD_TYPE=RelWithDebInfo >/dev/null
+cmake --build build -j"$(nproc)" --target plugin-host QirnLogUtl
+build/bin/plugin-host demo
