@@ -30,7 +30,7 @@ struct FaultDecision
 class FaultPlan
 {
 public:
-    // False with a reason when the specification does not parse.
+    // False with a reason when the fault text does not parse.
     bool parse(const QString &text, QString *error);
     void setSeed(quint64 seed) { m_random.seed(seed); }
     bool empty() const { return m_rules.empty(); }
