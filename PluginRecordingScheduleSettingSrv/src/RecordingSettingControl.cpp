@@ -37,8 +37,10 @@ RecordingSettingControl::RecordingSettingControl(const RecordingSettingControl &
 
 RecordingSettingControl &RecordingSettingControl::operator=(const RecordingSettingControl &other)
 {
-    m_tunnel = other.m_tunnel;
-    m_clientId.store(other.m_clientId.load());
+    if (this != &other) {
+        m_tunnel = other.m_tunnel;
+        m_clientId.store(other.m_clientId.load());
+    }
     return *this;
 }
 

@@ -129,7 +129,7 @@ QString RecordingSettingControl::ComposeScheRecTimeframeMsg(const QString &conte
     QString days;
     QString interval;
     bool sized = false;
-    for (const QJsonValue &entry : list) {
+    for (const QJsonValue entry : list) {
         const QJsonObject rectangle = entry.toObject();
         frame.clear();
         days = ComposeDayListMsg(integerOf(rectangle.value(DocKey::Left)),

@@ -54,7 +54,7 @@ QList<int> PluginRecordingScheduleSettingSrv::TimecardIDThatNeedsToRemoveCameraL
 QList<QVariant> PluginRecordingScheduleSettingSrv::GetCameraList(const VariantMap &timecard) const
 {
     const QVariant cameras = timecard.value(TimecardKey::CamList).toMap().value(TimecardKey::Cam);
-    const QList<QVariant> all = entries(cameras);
+    QList<QVariant> all = entries(cameras);
     // A lone "Cam" with nothing in it is no camera.
     if (all.size() == 1 && !isList(cameras) && all.constFirst().toMap().isEmpty())
         return {};
