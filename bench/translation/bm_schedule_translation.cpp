@@ -140,37 +140,31 @@ void BM_Timecards_Baseline(benchmark::State &state)
 
 } // namespace
 
-BENCHMARK(BM_Mappings_Translation)
-    ->Arg(1250)
-    ->Arg(2500)
-    ->Arg(5000)
-    ->Arg(10000)
-    ->Arg(20000)
-    ->Complexity(benchmark::oN)
-    ->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_Mappings_Baseline)
-    ->Arg(1250)
-    ->Arg(2500)
-    ->Arg(5000)
-    ->Arg(10000)
-    ->Arg(20000)
-    ->Complexity(benchmark::oN)
-    ->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_Timecards_Translation)
-    ->Arg(125)
-    ->Arg(250)
-    ->Arg(500)
-    ->Arg(1000)
-    ->Arg(2000)
-    ->Complexity(benchmark::oN)
-    ->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_Timecards_Baseline)
-    ->Arg(125)
-    ->Arg(250)
-    ->Arg(500)
-    ->Arg(1000)
-    ->Arg(2000)
-    ->Complexity(benchmark::oN)
-    ->Unit(benchmark::kMillisecond);
+namespace {
+
+// Sizes doubling over the range where a quadratic cost would show.
+void doublingFrom(benchmark::internal::Benchmark *benchmark, int first)
+{
+    for (int size = first; size <= first * 16; size *= 2)
+        benchmark->Arg(size);
+    benchmark->Complexity(benchmark::oN)->Unit(benchmark::kMillisecond);
+}
+
+void mappingSizes(benchmark::internal::Benchmark *benchmark)
+{
+    doublingFrom(benchmark, 1250);
+}
+
+void timecardSizes(benchmark::internal::Benchmark *benchmark)
+{
+    doublingFrom(benchmark, 125);
+}
+
+} // namespace
+
+BENCHMARK(BM_Mappings_Translation)->Apply(mappingSizes);
+BENCHMARK(BM_Mappings_Baseline)->Apply(mappingSizes);
+BENCHMARK(BM_Timecards_Translation)->Apply(timecardSizes);
+BENCHMARK(BM_Timecards_Baseline)->Apply(timecardSizes);
 
 BENCHMARK_MAIN();
