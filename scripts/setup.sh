@@ -3,7 +3,7 @@
 set -euo pipefail
 
 packages=(
-    build-essential cmake pkg-config
+    build-essential cmake pkg-config ccache
     qt6-base-dev qt6-base-dev-tools libqt6sql6-sqlite
     googletest libgtest-dev libgmock-dev libbenchmark-dev
     clang libclang-rt-14-dev
