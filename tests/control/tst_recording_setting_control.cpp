@@ -155,7 +155,7 @@ INSTANTIATE_TEST_SUITE_P(Operations, Messages, testing::Values(
     Row{"removal_keeps_elements_after_the_camera_list", [](auto &c, Done &d) { return c.RemoveTimecardCameraList(3, {camera("C_2", "4")}, d.take()); }, Read3 + back(Kept13, "<Extra>1</Extra>"), "ok", {}, answer(Three, "<Extra>1</Extra>")},
     Row{"removal_from_a_time_card_without_cameras_sends_it_unchanged", [](auto &c, Done &d) { return c.RemoveTimecardCameraList(3, {camera("C_1", "4")}, d.take()); }, Read3 + back(""), "ok", {}, answer("")},
     Row{"white_space_around_the_answer_is_ignored", [](auto &c, Done &d) { return c.RemoveTimecardCameraList(3, {camera("C_2", "4")}, d.take()); }, Read3 + back(Kept13), "ok", {}, "\r\n " + answer(Three) + " \n"},
-    Row{"removal_checks_the_answer_frame", [](auto &c, Done &d) { return c.RemoveTimecardCameraList(3, {camera("C_1", "4")}, d.take()); }, Read3, "failed", Removal, "<Other>" + Head + Three + "</Tmcard></Other>"},
+    Row{"removal_checks_the_answer_frame", [](auto &c, Done &d) { return c.RemoveTimecardCameraList(3, {camera("C_1", "4")}, d.take()); }, Read3, "failed", Removal, "<InsRecTmcardRes>" + Head + Three + "</Tmcard></InsRecTmcardRes>"},
     Row{"camera_list_that_cannot_be_read_sends_nothing", [](auto &c, Done &d) { return c.RemoveTimecardCameraList(3, {camera("C_1", "4")}, d.take()); }, Read3, "failed", Removal, answer("<!-- <CamList> -->" + Three)},
     Row{"failed_read_sends_nothing", [](auto &c, Done &d) { return c.RemoveTimecardCameraList(3, {camera("C_1", "4")}, d.take()); }, Read3, "failed", Removal, "<GetRecTmcardRes>"},
     Row{"cameras_replaced", [](auto &c, Done &d) { return c.UpdateTimecardCameraList(answer(Three), {camera("C_9", "4")}, d.take(), 0); }, back(New9), "ok"},
