@@ -4,8 +4,6 @@
 #include "TestLog.h"
 #include "TestTunnel.h"
 
-#include <QSharedPointer>
-
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -61,6 +59,8 @@ QString ele(const QString &days, const QString &interval, const QString &modeAnd
 QString always(const QString &mode) { return R"(<Ele><Frame><Name>Always</Name><Holiday>false</Holiday><RepeatMod>Weekly</RepeatMod><DLMod>SingleDay</DLMod><Intervals><Ele B="0" E="86400"/></Intervals><DayList><Ele B="1.0"/><Ele B="2.0"/><Ele B="3.0"/><Ele B="4.0"/><Ele B="5.0"/><Ele B="6.0"/><Ele B="7.0"/></DayList>)" + Period + "</Frame><RecMode>" + mode + "</RecMode><AllEvent>true</AllEvent><Motion>true</Motion><ContMotNum>1</ContMotNum><DigiInput>3</DigiInput></Ele>"; }
 QString insert(const QString &name, const QString &mapping, const QString &cameraList = {}) { return "<InsRecTmcard><Tmcard><Revision>0</Revision><TmcardID>0</TmcardID><Name>" + name + "</Name><Mapping>" + mapping + "</Mapping>" + cameraList + "</Tmcard></InsRecTmcard>"; }
 QString update(const QString &name, const QString &mapping, const QString &cameraList) { return "<UpdRecTmcard><Tmcard><Revision>5</Revision><TmcardID>2</TmcardID><Name>" + name + "</Name><Mapping>" + mapping + "</Mapping>" + cameraList + "</Tmcard></UpdRecTmcard>"; }
+// C_1 to C_n, in recording group 1.
+QList<QVariant> cameras(int n) { QList<QVariant> list; for (int i = 1; i <= n; ++i) list << camera(QStringLiteral("C_%1").arg(i), "1"); return list; }
 
 // Time card 3 as the server answers a read of it, and as it goes back.
 const QString Head = "<Tmcard><Revision>7</Revision><TmcardID>3</TmcardID><Name>50%1 off</Name><Mapping><Ele>x</Ele></Mapping>";
@@ -69,8 +69,6 @@ const QString Three = "<CamList><Cam><Name>C_1</Name><GrpID>1</GrpID></Cam><Cam>
 const QString Kept13 = "<CamList><Cam><Name>C_1</Name><RecGrpID>1</RecGrpID></Cam><Cam><Name>C_3</Name><RecGrpID>3</RecGrpID></Cam></CamList>";
 const QString New9 = "<CamList><Cam><Name>C_9</Name><RecGrpID>4</RecGrpID></Cam></CamList>";
 QString answer(const QString &cameraList, const QString &after = {}) { return "<GetRecTmcardRes>" + Head + cameraList + after + "</Tmcard></GetRecTmcardRes>"; }
-// C_1 to C_n, in recording group 1.
-QList<QVariant> cameras(int n) { QList<QVariant> list; for (int i = 1; i <= n; ++i) list << camera(QStringLiteral("C_%1").arg(i), "1"); return list; }
 QString back(const QString &cameraList, const QString &after = {}) { return "<UpdRecTmcard>" + Head + cameraList + after + "</Tmcard></UpdRecTmcard>"; }
 // clang-format on
 
@@ -106,13 +104,13 @@ TEST_P(Messages, GoOutExactlyAsWritten)
     TestTunnel tunnel; // answers at once; an empty completion must not be called
     tunnel.queueAnswer({true, "0", row.answer, true});
     Done done;
-    const bool started = row.send(*makeControl(&tunnel), done);
+    EXPECT_EQ(row.send(*makeControl(&tunnel), done), !row.bodies.isEmpty());
     QString bodies;
     for (const TestTunnel::Sent &sent : tunnel.sent())
         bodies += sent.body;
     EXPECT_EQ(bodies, row.bodies);
-    EXPECT_EQ(started, !row.bodies.isEmpty());
-    EXPECT_EQ(QString(done.calls == 0 ? "" : done.ok ? "ok" : "failed"), row.heard);
+    const char *heard[] = {"", done.ok ? "ok" : "failed", "more than once"};
+    EXPECT_EQ(QString(heard[done.calls < 2 ? done.calls : 2]), row.heard);
     const QStringList records = log.texts(2);
     EXPECT_EQ(records.isEmpty() ? QString() : records.last(), row.record);
 }
@@ -270,7 +268,7 @@ INSTANTIATE_TEST_SUITE_P(EveryOperation, SendPath, testing::Values(
 // clang-format on
 
 // Answers on the tunnel's own thread while this thread keeps sending,
-// switching the requester and replacing the control.
+// replacing the control and switching the requester.
 TEST(ControlThreads, EveryRequestCompletesOnceWhileTheHostSendsAndSwitchesRequester)
 {
     TestTunnel tunnel(TestTunnel::Delivery::OtherThread);
@@ -287,11 +285,13 @@ TEST(ControlThreads, EveryRequestCompletesOnceWhileTheHostSendsAndSwitchesReques
             control = makeControl(&tunnel); // the old one still has answers on their way
         control->SetClientID(&requesters[round % 2]);
         ASSERT_TRUE(control->RemoveTimecardCameraList(3, cameras(1), count));
-        // Goes on from the tunnel's thread with the requester this thread replaces.
+        // Goes on from the tunnel's thread with the requester that this thread writes.
         ASSERT_TRUE(control->DeleteSchedule(Summary, [&, next = control](bool, bool) {
             next->UpdateTimecardCameraList(answer(Three), {}, count, 0);
         }));
     }
+    for (int i = 0; completed < 2 * Rounds && i < 50'000'000; ++i)
+        control->SetClientID(&requesters[i % 2]);
     control.reset();
     tunnel.waitIdle();
     EXPECT_EQ(completed, 2 * Rounds);
