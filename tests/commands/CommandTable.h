@@ -22,7 +22,7 @@ struct CommandRow
     QString after;    // the time cards afterwards; empty: as seeded
     bool flag;
     QString code;
-    QVariant data;
+    QVariant data = QVariant();
 };
 
 inline void PrintTo(const CommandRow &row, std::ostream *os)
@@ -38,10 +38,12 @@ template <typename Row> std::string rowName(const ::testing::TestParamInfo<Row> 
     return name;
 }
 
-// Camera entries as clients send them, from "C_1/1 C_2/2".
+// A "GetRecTmcardRes" text holding the time cards written compactly.
+QString seedDocument(const QString &timecards);
+// Camera entries as clients send them, from "C_1/1 C_2/2"; "C_1:1" gives the
+// group as a number.
 QVariantList cameras(const QString &namesAndGroups);
 
-// Each row: seed, send the command, check what was sent, the time cards
-// afterwards and the one reply.
+// Each row: seed, send, check what was sent, the time cards after and the reply.
 class Commands : public ::testing::TestWithParam<CommandRow>
 {};

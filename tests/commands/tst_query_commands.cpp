@@ -9,7 +9,6 @@ namespace {
 
 const QString RecInfo = QStringLiteral("GetScheduleRecInfo");
 const QString Current = QStringLiteral("GetCurrentScheduleInfo");
-const QString AllInfo = QStringLiteral("GetAllScheduleRecInfo");
 
 QVariant summary(int type, const QString &content = QString())
 {
@@ -18,25 +17,15 @@ QVariant summary(int type, const QString &content = QString())
 }
 
 // One time frame: day numbers "1.0 2.0", intervals "0,3600 7200,86400".
-QString frame(const QString &days, const QString &intervals, const QString &mode,
-              const QString &more = QString(), const QString &repeat = QStringLiteral("Weekly"))
+QString frame(QString days, QString spans, const QString &mode, const QString &more = QString(),
+              const QString &repeat = QStringLiteral("Weekly"))
 {
-    QString dayList, intervalList;
-    for (const QString &day : days.split(QLatin1Char(' ')))
-        dayList += QStringLiteral(R"(<Ele B="%1"/>)").arg(day);
-    for (const QString &span : intervals.split(QLatin1Char(' ')))
-        intervalList +=
-            QStringLiteral(R"(<Ele B="%1" E="%2"/>)")
-                .arg(span.section(QLatin1Char(','), 0, 0), span.section(QLatin1Char(','), 1));
+    days = R"(<Ele B=")" + days.replace(" ", R"("/><Ele B=")") + R"("/>)";
+    spans =
+        R"(<Ele B=")" + spans.replace(" ", R"("/><Ele B=")").replace(",", R"(" E=")") + R"("/>)";
     return QStringLiteral("<Ele><Frame><RepeatMod>%1</RepeatMod><DayList>%2</DayList><Intervals>%3"
                           "</Intervals></Frame><RecMode>%4</RecMode>%5</Ele>")
-        .arg(repeat, dayList, intervalList, mode.toHtmlEscaped(), more);
-}
-
-// The customised time card, with cameras, holding the given mapping.
-QString customised(const QString &mapping)
-{
-    return QStringLiteral("#7 KOLT2 Customize Recording {%1} [C_1/1]").arg(mapping);
+        .arg(repeat, days, spans, mode.toHtmlEscaped(), more);
 }
 
 CommandRow inForce(const char *name, const QString &seed, const QString &command,
@@ -48,7 +37,8 @@ CommandRow inForce(const char *name, const QString &seed, const QString &command
 // The document of the customised time card in force, holding the given mapping.
 CommandRow document(const char *name, const QString &mapping, const QString &expected)
 {
-    return inForce(name, customised(mapping), RecInfo, summary(2, expected));
+    return inForce(name, QStringLiteral("#7 KOLT2 Customize Recording {%1} [C_1/1]").arg(mapping),
+                   RecInfo, summary(2, expected));
 }
 
 QString everyTrigger()
@@ -61,11 +51,21 @@ QString everyTrigger()
 
 const QString Lobby = QStringLiteral(
     R"({"Rectangles":[{"Bottom":18,"Left":0,"RecordingMode":"Continuous","Right":5,"Top":8}]})");
-const QString Both = QStringLiteral("#1 KOLT2 Default Continuous Recording [C_1/1] | ") +
-                     customised(QStringLiteral("lobby"));
+const QString Both = QStringLiteral(
+    "#1 KOLT2 Default Continuous Recording [C_1/1] | #7 KOLT2 Customize Recording {lobby} [C_1/1]");
+
+QVariantMap entry(const QString &id, const QString &name, const QString &content,
+                  const QVariantList &cams)
+{
+    return {{"TimeCardID", id},
+            {"ScheduleName", name},
+            {"Revision", "1"},
+            {"CustomizeContent", content},
+            {"CameraList", cams}};
+}
 
 INSTANTIATE_TEST_SUITE_P(
-    ScheduleInForce, Commands,
+    Queries, Commands,
     ::testing::Values(
         inForce("fresh server has no schedule in force", "", RecInfo, summary(5)),
         inForce("customised time card beside the default one is in force", Both, RecInfo,
@@ -87,12 +87,7 @@ INSTANTIATE_TEST_SUITE_P(
         // Qt reads "4294967297" as 1, the default time card, which would be left out.
         inForce("identifier outside int range is not the default time card",
                 "#4294967297 KOLT2 Customize Recording {lobby} [C_1/1]", RecInfo,
-                summary(2, Lobby))),
-    rowName<CommandRow>);
-
-INSTANTIATE_TEST_SUITE_P(
-    ScheduleDocument, Commands,
-    ::testing::Values(
+                summary(2, Lobby)),
         document(
             "two day runs by two intervals give four rectangles run by run",
             frame("1.0 2.0 3.0 5.0", "0,28800 64800,86400", "Continuous"),
@@ -102,9 +97,9 @@ INSTANTIATE_TEST_SUITE_P(
             R"({"Bottom":24,"Left":4,"RecordingMode":"Continuous","Right":5,"Top":18}]})"),
         document(
             "days out of order are runs of their own with six digits of hours",
-            frame("3.0 2.0", "1200,30000", "Continuous"),
-            R"({"Rectangles":[{"Bottom":8.33333,"Left":2,"RecordingMode":"Continuous","Right":3,)"
-            R"("Top":0.333333},{"Bottom":8.33333,"Left":1,"RecordingMode":"Continuous","Right":2,)"
+            frame("3.0 2.0", "1200,86399", "Continuous"),
+            R"({"Rectangles":[{"Bottom":23.9997,"Left":2,"RecordingMode":"Continuous","Right":3,)"
+            R"("Top":0.333333},{"Bottom":23.9997,"Left":1,"RecordingMode":"Continuous","Right":2,)"
             R"("Top":0.333333}]})"),
         document(
             "default event mapping has the short trigger set", "event week",
@@ -161,30 +156,17 @@ INSTANTIATE_TEST_SUITE_P(
             R"({"Rectangles":[{"Bottom":0,"Left":-1,"RecordingMode":"Continuous","Right":0,"Top":0}]})"),
         document("day numbers saturate", frame("1e10", "0,3600", "Continuous"),
                  R"({"Rectangles":[{"Bottom":1,"Left":2147483646,"RecordingMode":"Continuous",)"
-                 R"("Right":2147483647,"Top":0}]})")),
-    rowName<CommandRow>);
-
-QVariantMap entry(const QString &id, const QString &name, const QString &content,
-                  const QVariantList &cams)
-{
-    return {{"TimeCardID", id},
-            {"ScheduleName", name},
-            {"Revision", "1"},
-            {"CustomizeContent", content},
-            {"CameraList", cams}};
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    AllSchedules, Commands,
-    ::testing::Values(inForce(
-        "every time card is listed with identifier, revision and cameras as text",
-        "#1 Default Schedule {continuous week} | #12 Hall {lobby} [C_12/3]", AllInfo,
-        QVariantList{
-            entry(
-                "1", "Default Schedule",
-                R"({"Rectangles":[{"Bottom":24,"Left":0,"RecordingMode":"Continuous","Right":7,"Top":0}]})",
-                {}),
-            entry("12", "Hall", Lobby, cameras("C_12/3"))})),
+                 R"("Right":2147483647,"Top":0}]})"),
+        inForce(
+            "every time card is listed with identifier, revision and cameras as text",
+            "#1 Default Schedule {continuous week} | #12 Hall {lobby} [C_12/3]",
+            "GetAllScheduleRecInfo",
+            QVariantList{
+                entry(
+                    "1", "Default Schedule",
+                    R"({"Rectangles":[{"Bottom":24,"Left":0,"RecordingMode":"Continuous","Right":7,"Top":0}]})",
+                    {}),
+                entry("12", "Hall", Lobby, cameras("C_12/3"))})),
     rowName<CommandRow>);
 
 } // namespace
