@@ -3,6 +3,8 @@
 #include <QDebug>
 #include <QRegularExpression>
 
+#include <map>
+
 namespace {
 
 // One weekly time frame over the whole week: the plug-in's default time cards

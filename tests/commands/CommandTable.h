@@ -1,7 +1,6 @@
 #pragma once
 
-// One client command against the real plug-in, control, local tunnel and
-// simulated recording server, as a table row.
+// A client command as a table row, against the real plug-in and recording server.
 //
 // Time cards are written compactly, parts separated by " | ":
 //   #5 Lobby {lobby} [C_1/1 C_2/2]

@@ -90,8 +90,7 @@ INSTANTIATE_TEST_SUITE_P(
                        " [C_2/1] | #3 KOLT2 Default Event Recording {event week} [C_1/1]",
                    false, "0"},
         CommandRow{
-            "customised schedule takes the new time frames and the cameras, off every "
-            "other time card in turn",
+            "customised schedule takes the time frames, and the cameras off other time cards",
             "#3 Lobby [C_2/1 C_4/1] | #5 KOLT2 Customize Recording [C_9/1] | #6 Hall [C_1/1]",
             "CustomizeSchedule",
             QVariantMap{
