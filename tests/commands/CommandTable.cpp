@@ -7,8 +7,7 @@
 
 namespace {
 
-// One weekly time frame over the whole week: the plug-in's default time cards
-// and the server's default time card hold it.
+// The whole week in one weekly time frame, as the default time cards hold it.
 QString wholeWeek(const QString &mode)
 {
     return QStringLiteral(
@@ -118,11 +117,8 @@ QVariantList cameras(const QString &namesAndGroups)
 {
     QVariantList result;
     for (const QString &cam : namesAndGroups.split(QLatin1Char(' '), Qt::SkipEmptyParts))
-        result << QVariantMap{
-            {QStringLiteral("Name"), cam.section(QRegularExpression("[/:]"), 0, 0)},
-            {QStringLiteral("GrpID"), cam.contains(QLatin1Char(':'))
-                                          ? QVariant(cam.section(QLatin1Char(':'), 1).toInt())
-                                          : QVariant(cam.section(QLatin1Char('/'), 1))}};
+        result << QVariantMap{{QStringLiteral("Name"), cam.section(QLatin1Char('/'), 0, 0)},
+                              {QStringLiteral("GrpID"), cam.section(QLatin1Char('/'), 1)}};
     return result;
 }
 

@@ -1,7 +1,6 @@
 #pragma once
 
 // A client command as a table row, against the real plug-in and recording server.
-//
 // Time cards are written compactly, parts separated by " | ":
 //   #5 Lobby {lobby} [C_1/1 C_2/2]
 // identifier, name, mapping (an alias of CommandTable.cpp or the XML itself)
@@ -39,8 +38,7 @@ template <typename Row> std::string rowName(const ::testing::TestParamInfo<Row> 
 
 // A "GetRecTmcardRes" text holding the time cards written compactly.
 QString seedDocument(const QString &timecards);
-// Camera entries as clients send them, from "C_1/1 C_2/2"; "C_1:1" gives the
-// group as a number.
+// Camera entries as clients send them, from "C_1/1 C_2/2".
 QVariantList cameras(const QString &namesAndGroups);
 
 // Each row: seed, send, check what was sent, the time cards after and the reply.

@@ -5,9 +5,14 @@
 
 namespace {
 
+QVariantMap entry(const QString &id, const QVariantList &cams)
+{
+    return {{"scheduleID", id}, {"camIDList", cams}};
+}
+
 QVariantMap entry(const QString &id, const QString &cams)
 {
-    return {{"scheduleID", id}, {"camIDList", cameras(cams)}};
+    return entry(id, cameras(cams));
 }
 
 QVariantMap move(const QVariantList &removals, const QVariantList &additions)
@@ -40,9 +45,12 @@ INSTANTIATE_TEST_SUITE_P(
         CommandRow{"camera standing twice is removed entirely", "#5 Five [C_1/1 C_2/2 C_1/1]",
                    "UpdateCamRecSchedule", move({entry("5", "C_1/1")}, {}),
                    "GetRecTmcard(5), UpdRecTmcard(5)", "#5 Five [C_2/2]", false, "0"},
-        CommandRow{"group sent as a number matches the server's text", "#5 Five [C_1/1 C_2/2]",
-                   "UpdateCamRecSchedule", move({entry("5", "C_1:1")}, {}),
-                   "GetRecTmcard(5), UpdRecTmcard(5)", "#5 Five [C_2/2]", false, "0"},
+        // Compared whole, a client's entry matched only when it held the server's keys alone.
+        CommandRow{
+            "removal matches by name and group only, the group read as text",
+            "#5 Five [C_1/1 C_2/2]", "UpdateCamRecSchedule",
+            move({entry("5", {QVariantMap{{"Name", "C_1"}, {"GrpID", 1}, {"Model", "X"}}})}, {}),
+            "GetRecTmcard(5), UpdRecTmcard(5)", "#5 Five [C_2/2]", false, "0"},
         CommandRow{"camera of another group stays", "#5 Five [C_1/1 C_2/2]", "UpdateCamRecSchedule",
                    move({entry("5", "C_1/2")}, {}), "GetRecTmcard(5), UpdRecTmcard(5)", "", false,
                    "0"},
@@ -117,8 +125,7 @@ INSTANTIATE_TEST_SUITE_P(
                    "GetRecTmcard(all), GetRecTmcard(1), UpdRecTmcard(1)", "", false, "0"}),
     rowName<CommandRow>);
 
-// The server is given 2000 ms for each camera of the time card it rewrites:
-// those held before a removal, those held after an addition; at least 15000 ms.
+// 2000 ms per camera held before a removal or after an addition; at least 15000 ms.
 TEST(UpdateCamRecSchedule, TimeOutGrowsWithTheCamerasOfTheTimeCard)
 {
     LivePlugin live;

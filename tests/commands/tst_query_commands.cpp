@@ -1,6 +1,5 @@
-// "GetScheduleRecInfo", "GetCurrentScheduleInfo" and "GetAllScheduleRecInfo":
-// which schedule is in force, and the schedule document written from what the
-// server's time cards hold.
+// "GetScheduleRecInfo", "GetCurrentScheduleInfo" and "GetAllScheduleRecInfo": the
+// schedule in force, and the document written from what the time cards hold.
 
 #include "CommandTable.h"
 #include "TriggerNames.h"
