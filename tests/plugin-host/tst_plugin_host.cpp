@@ -1,19 +1,13 @@
 // plugin-host driven as a process, as tools drive it: each case of the
-// transcript files under data/ runs its "$ " steps against a fresh folder
-// (server database and exchange log) and must print exactly the file.
-//
-// Transcript lines: "$ ARGS" a run of plugin-host (words split at spaces; a
-// word from "{", "[", "<" or "'" on takes the rest of the line, quotes
-// removed), "| TEXT" its standard input, then what it gave: standard output
-// as is, "! " standard error, ">> IDENTITY COMMAND BODY" and "<< OUTCOME CODE"
-// each exchange with the server (IDENTITY "own" for the tunnel's own), and
-// "= N" the exit status when it is not 0.
+// transcript files under data/ (their format: data/README.md) must print
+// exactly what the file shows.
 
 #include <QDir>
 #include <QFile>
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QProcess>
+#include <QRegularExpression>
 #include <QTemporaryDir>
 
 #include <gtest/gtest.h>
@@ -29,19 +23,15 @@ QString readText(const QString &fileName)
     return QString::fromUtf8(file.readAll());
 }
 
+// A step's arguments: words split at spaces, but a word that begins with
+// "{", "[", "<" or "'" takes the rest of the line, single quotes removed.
 QStringList words(const QString &line)
 {
+    static const QRegularExpression word(u"['{\\[<].*|[^ ]+"_s);
     QStringList result;
-    for (qsizetype at = 0; at < line.size();) {
-        if (QStringLiteral("{[<'").contains(line.at(at))) {
-            QString rest = line.mid(at);
-            result << (rest.startsWith(u'\'') ? rest.mid(1, rest.size() - 2) : rest);
-            break;
-        }
-        qsizetype end = line.indexOf(u' ', at);
-        end = end < 0 ? line.size() : end;
-        result << line.mid(at, end - at);
-        at = end + 1;
+    for (auto it = word.globalMatch(line); it.hasNext();) {
+        const QString found = it.next().captured();
+        result << (found.startsWith(u'\'') ? found.mid(1, found.size() - 2) : found);
     }
     return result;
 }
@@ -78,8 +68,8 @@ public:
         for (const QString &line : QString::fromUtf8(process.readAllStandardError()).split(u'\n'))
             text += line.isEmpty() ? QString() : "! "_L1 + line + u'\n';
         text += exchanges();
-        if (process.exitCode() != 0)
-            text += u"= %1\n"_s.arg(process.exitCode());
+        const int status = process.exitStatus() == QProcess::NormalExit ? process.exitCode() : -1;
+        text += status == 0 ? QString() : u"= %1\n"_s.arg(status);
         text.replace(m_dir.path(), u"$TMP"_s);
         for (const auto &[name, place] : Places)
             text.replace(place, name);
@@ -128,11 +118,6 @@ std::vector<Case> casesOf(const char *fileName)
     return cases;
 }
 
-void PrintTo(const Case &c, std::ostream *os)
-{
-    *os << c.name;
-}
-
 class Transcript : public testing::TestWithParam<Case>
 {};
 
@@ -140,24 +125,18 @@ TEST_P(Transcript, PrintsExactlyWhatTheFileShows)
 {
     HostRun run;
     QString actual;
-    QString arguments;
-    QString input;
-    const auto flush = [&] {
-        if (!arguments.isNull())
-            actual += run.step(arguments, input);
-    };
-    for (const QString &line : GetParam().text.split(u'\n')) {
-        if (line.startsWith("$ "_L1)) {
-            flush();
-            actual += line + u'\n';
-            arguments = line.mid(2);
-            input.clear();
-        } else if (line.startsWith("| "_L1)) {
-            actual += line + u'\n';
-            input += line.mid(2) + u'\n';
+    for (const QString &step : ('\n' + GetParam().text).split(u"\n$ "_s, Qt::SkipEmptyParts)) {
+        const QStringList lines = step.split(u'\n');
+        actual += "$ "_L1 + lines.first() + u'\n';
+        QString input;
+        for (const QString &line : lines) {
+            if (line.startsWith("| "_L1)) {
+                actual += line + u'\n';
+                input += line.mid(2) + u'\n';
+            }
         }
+        actual += run.step(lines.first(), input);
     }
-    flush();
     EXPECT_EQ(actual.toStdString(), GetParam().text.trimmed().append(u'\n').toStdString());
 }
 
