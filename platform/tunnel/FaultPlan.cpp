@@ -77,7 +77,7 @@ std::pair<std::chrono::milliseconds, std::chrono::milliseconds> readLatency(cons
     if (value.isEmpty() || bounds.size() > 2)
         throw BadFault{QStringLiteral("latency needs a duration such as 50ms or 10-80ms")};
     QString low = bounds.front();
-    const QString high = bounds.back();
+    const QString &high = bounds.back();
     if (bounds.size() == 2 && !low.endsWith(QLatin1Char('s')))
         low += high.endsWith(QLatin1String("ms")) ? QStringLiteral("ms")
                : high.endsWith(QLatin1Char('s'))  ? QStringLiteral("s")

@@ -51,7 +51,7 @@ struct Script
     ServerAnswer answer(const QString &body)
     {
         std::unique_lock<std::mutex> lock(mutex);
-        asked += body;
+        asked += body.toStdString();
         backend = std::this_thread::get_id();
         changed.notify_all();
         changed.wait(lock, [this] { return open; });
@@ -64,7 +64,7 @@ struct Script
         changed.notify_all();
     }
     // Waits for this many handler calls and bodies asked.
-    void waitFor(std::size_t called, qsizetype bodies = 0)
+    void waitFor(std::size_t called, std::size_t bodies = 0)
     {
         std::unique_lock<std::mutex> lock(mutex);
         changed.wait(lock, [&] { return calls.size() >= called && asked.size() >= bodies; });
@@ -74,7 +74,7 @@ struct Script
     std::condition_variable changed;
     bool open = false;
     std::vector<Delivery> calls;
-    QString asked;
+    std::string asked; // not QString: Qt frees text out of the race checker's sight
     std::thread::id backend;
 };
 
@@ -140,7 +140,7 @@ TEST_P(InjectedFaults, HitTheRequestsTheySelect)
     std::replace(outcomes.begin(), outcomes.end(), '0', 'a');
     EXPECT_EQ(outcomes, GetParam().outcomes);
     EXPECT_EQ(order, GetParam().order);
-    EXPECT_EQ(script.asked.toStdString(), GetParam().asked);
+    EXPECT_EQ(script.asked, GetParam().asked);
 }
 
 INSTANTIATE_TEST_SUITE_P(
@@ -193,7 +193,7 @@ TEST(LocalTunnel, TimeOutsAndDestructionDeliverOkFalseOnceAndTheLogSaysWhy)
         order +=
             call.ok || !call.code.isEmpty() || !call.content.isEmpty() ? '?' : char('0' + call.tag);
     EXPECT_EQ(order, "213");
-    EXPECT_EQ(script.asked, u"<b>\"1\"</b>"_s) << "a time-out in the queue: never carried out";
+    EXPECT_EQ(script.asked, "<b>\"1\"</b>") << "a time-out in the queue: never carried out";
     QFile file(log);
     ASSERT_TRUE(file.open(QIODevice::ReadOnly));
     EXPECT_EQ(
@@ -213,8 +213,8 @@ TEST(LocalTunnel, TimeOutsAndDestructionDeliverOkFalseOnceAndTheLogSaysWhy)
 // handler call, each one refused gets none.
 TEST(LocalTunnelUnderLoad, EveryTakenRequestIsAnsweredExactlyOnce)
 {
-    constexpr int Senders = 4;
-    constexpr int Each = 1000;
+    constexpr std::size_t Senders = 4;
+    constexpr std::size_t Each = 1000;
     std::vector<std::atomic<int>> calls(Senders * Each);
     std::vector<char> taken(Senders * Each);
     Script script;
@@ -224,9 +224,10 @@ TEST(LocalTunnelUnderLoad, EveryTakenRequestIsAnsweredExactlyOnce)
             u"refuse=0.05,fail=0.05,drop=0.05,code=0.05:7,reorder=0.2,latency@U=0-1ms"_s;
         LocalTunnel tunnel(script.echo(), {256, faults, 1, {}, u"local"_s});
         std::vector<std::thread> senders;
-        for (int t = 0; t < Senders; ++t) {
+        senders.reserve(Senders);
+        for (std::size_t t = 0; t < Senders; ++t) {
             senders.emplace_back([&, t] {
-                for (int i = t * Each; i < (t + 1) * Each; ++i)
+                for (std::size_t i = t * Each; i < (t + 1) * Each; ++i)
                     taken[i] = send(
                         tunnel, i % 3 ? u"G"_s : u"U"_s, QString(),
                         [&, i](bool, auto &, auto &, auto &, auto &, bool) { ++calls[i]; },

@@ -162,29 +162,30 @@ Result<HostOptions> readOptions(const HostParser &host, HostOptions options)
     options.answerLayout = parser.value(host.layout);
     options.faults = parser.value(host.faults);
 
+    const std::optional<qint64> clientId = clientNumber(parser.value(host.client));
+    const bool traced = parser.isSet(host.traceLevel);
     const Result<qint64> seed =
         wholeNumber(parser.value(host.seedFaults), 0, std::numeric_limits<qint64>::max(),
                     "--seed-faults takes a whole number of 0 or more");
-    if (!seed)
-        return Failure{seed.error()};
-    options.faultSeed = static_cast<quint64>(*seed);
     const Result<qint64> timeout =
         wholeNumber(parser.value(host.replyTimeout), 1, std::numeric_limits<qint32>::max(),
                     "--reply-timeout takes a whole number of milliseconds, 1 or more");
-    if (!timeout)
-        return Failure{timeout.error()};
-    options.replyTimeoutMs = static_cast<int>(*timeout);
-    const std::optional<qint64> clientId = clientNumber(parser.value(host.client));
-    if (!clientId)
-        return Failure{QStringLiteral("--client takes a whole number from 0 to 2^53")};
-    options.client = *clientId;
-    if (parser.isSet(host.traceLevel)) {
-        const Result<qint64> level = wholeNumber(parser.value(host.traceLevel), 0, 255,
-                                                 "--trace-level takes a level from 0 to 255");
-        if (!level)
-            return Failure{level.error()};
-        options.traceLevel = static_cast<int>(*level);
+    const Result<qint64> client =
+        clientId ? Result<qint64>(*clientId)
+                 : Failure{QStringLiteral("--client takes a whole number from 0 to 2^53")};
+    const Result<qint64> level = traced ? wholeNumber(parser.value(host.traceLevel), 0, 255,
+                                                      "--trace-level takes a level from 0 to 255")
+                                        : Result<qint64>(0);
+    // In this order: the first mistake is the one reported.
+    for (const Result<qint64> *number : {&seed, &timeout, &client, &level}) {
+        if (!*number)
+            return Failure{number->error()};
     }
+    options.faultSeed = static_cast<quint64>(*seed);
+    options.replyTimeoutMs = static_cast<int>(*timeout);
+    options.client = *client;
+    if (traced)
+        options.traceLevel = static_cast<int>(*level);
     return options;
 }
 

@@ -95,7 +95,7 @@ public:
                 ? QString::fromUtf8(JsonValues::compact(QJsonValue::fromVariant(request.payload)))
                 : QString();
         printText(QStringLiteral("> %1 %2").arg(command, shown).trimmed());
-        const std::optional<ReplyCollector::Reply> reply = m_runner.send(request);
+        std::optional<ReplyCollector::Reply> reply = m_runner.send(request);
         if (!reply) {
             m_failed = true;
             return std::nullopt;

@@ -57,7 +57,7 @@ struct Week
 Week readWeek(const QJsonArray &rectangles)
 {
     Week week;
-    for (const QJsonValue &value : rectangles) {
+    for (const auto &value : rectangles) {
         const QJsonObject rectangle = value.toObject();
         const QString mode = rectangle.value(QStringLiteral("RecordingMode")).toString();
         const int left = rectangle.value(QStringLiteral("Left")).toInt(-1);
