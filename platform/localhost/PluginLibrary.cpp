@@ -23,6 +23,28 @@ bool PluginLibrary::fail(const QString &reason)
     return false;
 }
 
+QString PluginLibrary::metaDataMismatch()
+{
+    const QJsonObject metaData = m_loader.metaData();
+    if (metaData.isEmpty()) {
+        // Loading tells why the file is no plug-in in Qt's own words.
+        m_loader.load();
+        return m_loader.errorString();
+    }
+    const QString iid = metaData.value(QStringLiteral("IID")).toString();
+    if (iid != m_interfaceId)
+        return QStringLiteral("the plug-in's interface is \"%1\", not \"%2\"")
+            .arg(iid, m_interfaceId);
+    const QString pluginId = metaData.value(QStringLiteral("MetaData"))
+                                 .toObject()
+                                 .value(QStringLiteral("PluginID"))
+                                 .toString();
+    if (pluginId != m_pluginId)
+        return QStringLiteral("the plug-in's PluginID is \"%1\", not \"%2\"")
+            .arg(pluginId, m_pluginId);
+    return QString();
+}
+
 bool PluginLibrary::load()
 {
     const QFileInfo info(m_fileName);
@@ -32,25 +54,9 @@ bool PluginLibrary::load()
         return fail(QStringLiteral("not a readable file"));
 
     m_loader.setFileName(m_fileName);
-    // Only metadata is read here; nothing of the library runs yet.
-    const QJsonObject metaData = m_loader.metaData();
-    if (metaData.isEmpty()) {
-        // Loading tells why the file is no plug-in in Qt's own words.
-        m_loader.load();
-        return fail(m_loader.errorString());
-    }
-    const QString iid = metaData.value(QStringLiteral("IID")).toString();
-    if (iid != m_interfaceId)
-        return fail(QStringLiteral("the plug-in's interface is \"%1\", not \"%2\"")
-                        .arg(iid, m_interfaceId));
-    const QString pluginId = metaData.value(QStringLiteral("MetaData"))
-                                 .toObject()
-                                 .value(QStringLiteral("PluginID"))
-                                 .toString();
-    if (pluginId != m_pluginId)
-        return fail(QStringLiteral("the plug-in's PluginID is \"%1\", not \"%2\"")
-                        .arg(pluginId, m_pluginId));
-
+    const QString mismatch = metaDataMismatch();
+    if (!mismatch.isEmpty())
+        return fail(mismatch);
     m_instance = m_loader.instance();
     if (!m_instance)
         return fail(m_loader.errorString());

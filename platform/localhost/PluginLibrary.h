@@ -29,6 +29,9 @@ public:
 
 private:
     bool fail(const QString &reason);
+    // Why the file's embedded metadata is not the expected plug-in's, or
+    // empty; nothing of the library runs.
+    QString metaDataMismatch();
 
     QPluginLoader m_loader;
     QString m_fileName;

@@ -14,13 +14,13 @@ ExchangeLog::~ExchangeLog()
         std::fclose(m_file);
 }
 
-bool ExchangeLog::open(const QString &path, QString *error)
+std::optional<QString> ExchangeLog::open(const QString &path)
 {
     m_file = std::fopen(QFile::encodeName(path).constData(), "a");
-    if (!m_file && error)
-        *error = QStringLiteral("exchange log %1: %2")
-                     .arg(path, QString::fromLocal8Bit(std::strerror(errno)));
-    return m_file != nullptr;
+    if (m_file)
+        return std::nullopt;
+    return QStringLiteral("exchange log %1: %2")
+        .arg(path, QString::fromLocal8Bit(std::strerror(errno)));
 }
 
 void ExchangeLog::write(const ExchangeRecord &record)

@@ -4,6 +4,7 @@
 
 #include <cstdio>
 #include <mutex>
+#include <optional>
 
 // One exchange as the log records it.
 struct ExchangeRecord
@@ -34,8 +35,8 @@ public:
     ExchangeLog(const ExchangeLog &) = delete;
     ExchangeLog &operator=(const ExchangeLog &) = delete;
 
-    bool open(const QString &path, QString *error);
-    bool isOpen() const { return m_file != nullptr; }
+    // Opens the file for appending; why it does not open, or nothing.
+    std::optional<QString> open(const QString &path);
     void write(const ExchangeRecord &record);
 
 private:

@@ -21,7 +21,7 @@ struct FaultDecision
     QString describe() const;
 };
 
-// Injected faults, reproducible from a seed: the same specification, seed and
+// Injected faults, reproducible from a seed: the same fault text, seed and
 // sequence of requests give the same decisions. Grammar (README.md):
 //   item[,item...]   item = kind[@selector][=value]
 //   kind: latency refuse fail drop code reorder
@@ -30,10 +30,10 @@ struct FaultDecision
 class FaultPlan
 {
 public:
-    // False with a reason when the fault text does not parse.
-    bool parse(const QString &text, QString *error);
+    // Replaces the rules with those of a fault text. Why the text does not
+    // parse (the plan is then empty), or nothing.
+    std::optional<QString> parse(const QString &text);
     void setSeed(quint64 seed) { m_random.seed(seed); }
-    bool empty() const { return m_rules.empty(); }
 
     // Counts the request (from 1, per tunnel and per command) and decides.
     FaultDecision decide(const QString &command);
@@ -53,7 +53,9 @@ private:
         std::chrono::milliseconds maxLatency{0};
     };
 
-    bool parseItem(const QString &item, QString *error);
+    static Rule readRule(const QString &item);
+    bool hits(const Rule &rule, const QString &command, quint64 request, quint64 ofCommand);
+    std::chrono::milliseconds drawLatency(const Rule &rule);
     double draw();
 
     std::vector<Rule> m_rules;

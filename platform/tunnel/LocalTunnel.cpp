@@ -8,6 +8,7 @@
 #include <deque>
 #include <map>
 #include <mutex>
+#include <optional>
 #include <thread>
 
 namespace {
@@ -71,26 +72,43 @@ struct LocalTunnel::State
     std::thread backendThread;
     std::thread deliveryThread;
 
+    // Backend thread.
     void backendLoop(const TunnelBackendFactory &factory);
+    TunnelBackend startBackend(const TunnelBackendFactory &factory);
+    void runTask(Task &task, std::unique_lock<std::mutex> &lock);
+    void carryOut(quint64 seq, const TunnelBackend &backend, std::unique_lock<std::mutex> &lock);
+    void releaseQueuedTasks();
+
+    // Delivery thread.
     void deliveryLoop();
+    void deliverAllPending(std::unique_lock<std::mutex> &lock);
+    void deliverOutcome(Entry &entry);
     void deliver(Entry &entry, bool ok, const QString &code, const QString &content,
                  const QString &outcome);
+    struct Due
+    {
+        std::map<quint64, Entry>::iterator entry;
+        Clock::time_point at;
+    };
     // The pending entry to deliver next and when, under the lock.
-    std::map<quint64, Entry>::iterator nextDue(Clock::time_point *due);
+    std::optional<Due> nextDue();
+    bool idle() const { return (pending.empty() && !delivering) || !deliveryThread.joinable(); }
 };
 
 TunnelBackendFactory recordingServerBackend(const QString &databasePath, AnswerLayout layout,
                                             RecordingServer **server)
 {
-    return [databasePath, layout, server](QString *error) -> TunnelBackend {
+    return [databasePath, layout, server]() -> StartedBackend {
         auto owned = std::make_shared<RecordingServer>(databasePath, layout);
-        if (!owned->open(error))
-            return {};
+        QString error;
+        if (!owned->open(&error))
+            return {{}, error};
         if (server)
             *server = owned.get();
-        return [owned](const QString &command, const QString &body) {
-            return owned->handle(command, body);
-        };
+        return {[owned](const QString &command, const QString &body) {
+                    return owned->handle(command, body);
+                },
+                {}};
     };
 }
 
@@ -100,16 +118,16 @@ LocalTunnel::LocalTunnel(TunnelBackendFactory factory, LocalTunnelOptions option
     State &state = *m_state;
     state.options = std::move(options);
     state.ownIdentity = static_cast<IKoltTunnelClient *>(this);
-    QString error;
-    if (!state.faults.parse(state.options.faults, &error)) {
-        state.error = error;
+    if (std::optional<QString> error = state.faults.parse(state.options.faults)) {
+        state.error = *error;
         return;
     }
     state.faults.setSeed(state.options.faultSeed);
-    if (!state.options.exchangeLogPath.isEmpty() &&
-        !state.log.open(state.options.exchangeLogPath, &error)) {
-        state.error = error;
-        return;
+    if (!state.options.exchangeLogPath.isEmpty()) {
+        if (std::optional<QString> error = state.log.open(state.options.exchangeLogPath)) {
+            state.error = *error;
+            return;
+        }
     }
     state.backendThread =
         std::thread([&state, factory = std::move(factory)] { state.backendLoop(factory); });
@@ -135,26 +153,31 @@ LocalTunnel::~LocalTunnel()
         state.backendThread.join();
 }
 
-void LocalTunnel::State::backendLoop(const TunnelBackendFactory &factory)
+TunnelBackend LocalTunnel::State::startBackend(const TunnelBackendFactory &factory)
 {
-    TunnelBackend backend;
-    QString factoryError;
+    StartedBackend started;
     try {
-        backend = factory ? factory(&factoryError) : TunnelBackend();
+        if (factory)
+            started = factory();
     } catch (...) {
-        factoryError = QStringLiteral("the backend could not be created");
+        started = {{}, QStringLiteral("the backend could not be created")};
     }
     {
         const std::lock_guard<std::mutex> lock(mutex);
-        connected = static_cast<bool>(backend);
+        connected = static_cast<bool>(started.backend);
         if (!connected)
-            error = factoryError.isEmpty() ? QStringLiteral("no backend") : factoryError;
+            error = started.error.isEmpty() ? QStringLiteral("no backend") : started.error;
         factoryRan = true;
     }
     changed.notify_all();
+    return std::move(started.backend);
+}
+
+void LocalTunnel::State::backendLoop(const TunnelBackendFactory &factory)
+{
+    TunnelBackend backend = startBackend(factory);
     if (!backend)
         return;
-
     std::unique_lock<std::mutex> lock(mutex);
     for (;;) {
         backendWake.wait(lock, [&] { return stopping || !jobs.empty(); });
@@ -162,83 +185,99 @@ void LocalTunnel::State::backendLoop(const TunnelBackendFactory &factory)
             break;
         const Job job = jobs.front();
         jobs.pop_front();
-        if (job.task) {
-            lock.unlock();
-            (*job.task->work)();
-            lock.lock();
-            job.task->ran = job.task->done = true;
-            changed.notify_all();
-            continue;
-        }
-        auto it = pending.find(job.seq);
-        // Already delivered as timed out: a request the caller gave up on is
-        // never carried out.
-        if (it == pending.end() || Clock::now() >= it->second.deadline)
-            continue;
-        Entry &entry = it->second;
-        if (entry.faults.fail || entry.faults.code) {
-            entry.answered = true;
-            entry.readyAt = Clock::now() + entry.faults.latency;
-            deliveryWake.notify_one();
-            continue;
-        }
-        const QString command = entry.record.command;
-        const QString body = entry.record.body;
-        lock.unlock();
-        ServerAnswer answer;
-        bool exchanged = true;
-        try {
-            answer = backend(command, body);
-        } catch (...) {
-            exchanged = false;
-        }
-        lock.lock();
-        it = pending.find(job.seq);
-        if (it == pending.end()) {
-            // Its time-out was delivered already; the answer is dropped.
-            ExchangeRecord late;
-            late.seq = job.seq;
-            late.outcome = QStringLiteral("late");
-            late.command = command;
-            late.code = answer.code;
-            late.content = answer.content;
-            lock.unlock();
-            log.write(late);
-            lock.lock();
-            continue;
-        }
-        Entry &answered = it->second;
-        answered.answered = true;
-        answered.readyAt = Clock::now() + answered.faults.latency;
-        answered.record.ok = exchanged && !answered.faults.drop;
-        answered.record.code = answer.code;
-        answered.record.content = answer.content;
-        deliveryWake.notify_one();
-    }
-    // Closures still queued are not run; their callers are released.
-    for (const Job &job : jobs) {
         if (job.task)
-            job.task->done = true;
+            runTask(*job.task, lock);
+        else
+            carryOut(job.seq, backend, lock);
     }
-    jobs.clear();
     lock.unlock();
-    changed.notify_all();
+    releaseQueuedTasks();
     // The backend (and a database connection in it) ends on this thread.
     backend = nullptr;
 }
 
-std::map<quint64, Entry>::iterator LocalTunnel::State::nextDue(Clock::time_point *due)
+void LocalTunnel::State::runTask(Task &task, std::unique_lock<std::mutex> &lock)
 {
-    auto next = pending.end();
+    lock.unlock();
+    (*task.work)();
+    lock.lock();
+    task.ran = task.done = true;
+    changed.notify_all();
+}
+
+void LocalTunnel::State::carryOut(quint64 seq, const TunnelBackend &backend,
+                                  std::unique_lock<std::mutex> &lock)
+{
+    auto it = pending.find(seq);
+    // Already delivered as timed out: a request the caller gave up on is
+    // never carried out.
+    if (it == pending.end() || Clock::now() >= it->second.deadline)
+        return;
+    Entry &entry = it->second;
+    if (entry.faults.fail || entry.faults.code) {
+        entry.answered = true;
+        entry.readyAt = Clock::now() + entry.faults.latency;
+        deliveryWake.notify_one();
+        return;
+    }
+    const QString command = entry.record.command;
+    const QString body = entry.record.body;
+    lock.unlock();
+    ServerAnswer answer;
+    bool exchanged = true;
+    try {
+        answer = backend(command, body);
+    } catch (...) {
+        exchanged = false;
+    }
+    lock.lock();
+    it = pending.find(seq);
+    if (it == pending.end()) {
+        // Its time-out was delivered already; the answer is dropped.
+        ExchangeRecord late;
+        late.seq = seq;
+        late.outcome = QStringLiteral("late");
+        late.command = command;
+        late.code = answer.code;
+        late.content = answer.content;
+        lock.unlock();
+        log.write(late);
+        lock.lock();
+        return;
+    }
+    Entry &answered = it->second;
+    answered.answered = true;
+    answered.readyAt = Clock::now() + answered.faults.latency;
+    answered.record.ok = exchanged && !answered.faults.drop;
+    answered.record.code = answer.code;
+    answered.record.content = answer.content;
+    deliveryWake.notify_one();
+}
+
+void LocalTunnel::State::releaseQueuedTasks()
+{
+    {
+        const std::lock_guard<std::mutex> lock(mutex);
+        // Closures still queued are not run; their callers are released.
+        for (const Job &job : jobs) {
+            if (job.task)
+                job.task->done = true;
+        }
+        jobs.clear();
+    }
+    changed.notify_all();
+}
+
+std::optional<LocalTunnel::State::Due> LocalTunnel::State::nextDue()
+{
+    std::optional<Due> next;
     for (auto it = pending.begin(); it != pending.end(); ++it) {
         const Entry &entry = it->second;
         Clock::time_point at = entry.deadline;
         if (entry.answered && !(entry.held && pending.size() > 1))
             at = std::min(entry.readyAt, entry.deadline);
-        if (next == pending.end() || at < *due) {
-            next = it;
-            *due = at;
-        }
+        if (!next || at < next->at)
+            next = Due{it, at};
     }
     return next;
 }
@@ -259,34 +298,50 @@ void LocalTunnel::State::deliver(Entry &entry, bool ok, const QString &code, con
     }
 }
 
+void LocalTunnel::State::deliverOutcome(Entry &entry)
+{
+    const bool inTime = entry.answered && entry.readyAt <= entry.deadline;
+    if (!inTime)
+        deliver(entry, false, QString(), QString(), QStringLiteral("timeout"));
+    else if (entry.faults.fail)
+        deliver(entry, false, QString(), QString(), QStringLiteral("failed"));
+    else if (entry.faults.code)
+        deliver(entry, true, *entry.faults.code, QString(), QStringLiteral("code"));
+    else if (!entry.record.ok)
+        deliver(entry, false, QString(), QString(),
+                entry.faults.drop ? QStringLiteral("dropped") : QStringLiteral("failed"));
+    else
+        deliver(entry, true, entry.record.code, entry.record.content, QStringLiteral("answered"));
+}
+
+void LocalTunnel::State::deliverAllPending(std::unique_lock<std::mutex> &lock)
+{
+    std::map<quint64, Entry> left;
+    left.swap(pending);
+    delivering = true;
+    lock.unlock();
+    for (auto &item : left)
+        deliver(item.second, false, QString(), QString(), QStringLiteral("shutdown"));
+    lock.lock();
+    delivering = false;
+    changed.notify_all();
+}
+
 void LocalTunnel::State::deliveryLoop()
 {
     std::unique_lock<std::mutex> lock(mutex);
-    for (;;) {
-        if (stopping) {
-            std::map<quint64, Entry> left;
-            left.swap(pending);
-            delivering = true;
-            lock.unlock();
-            for (auto &item : left)
-                deliver(item.second, false, QString(), QString(), QStringLiteral("shutdown"));
-            lock.lock();
-            delivering = false;
-            changed.notify_all();
-            return;
-        }
-        Clock::time_point due;
-        auto next = nextDue(&due);
-        if (next == pending.end()) {
+    while (!stopping) {
+        const std::optional<Due> next = nextDue();
+        if (!next) {
             deliveryWake.wait(lock);
             continue;
         }
-        if (Clock::now() < due) {
-            deliveryWake.wait_until(lock, due);
+        if (Clock::now() < next->at) {
+            deliveryWake.wait_until(lock, next->at);
             continue;
         }
-        Entry entry = std::move(next->second);
-        pending.erase(next);
+        Entry entry = std::move(next->entry->second);
+        pending.erase(next->entry);
         // A held answer is released once a later request's answer went out.
         for (auto &item : pending) {
             if (item.first < entry.record.seq)
@@ -294,25 +349,14 @@ void LocalTunnel::State::deliveryLoop()
         }
         delivering = true;
         lock.unlock();
-        const bool inTime = entry.answered && entry.readyAt <= entry.deadline;
-        if (!inTime)
-            deliver(entry, false, QString(), QString(), QStringLiteral("timeout"));
-        else if (entry.faults.fail)
-            deliver(entry, false, QString(), QString(), QStringLiteral("failed"));
-        else if (entry.faults.code)
-            deliver(entry, true, *entry.faults.code, QString(), QStringLiteral("code"));
-        else if (!entry.record.ok)
-            deliver(entry, false, QString(), QString(),
-                    entry.faults.drop ? QStringLiteral("dropped") : QStringLiteral("failed"));
-        else
-            deliver(entry, true, entry.record.code, entry.record.content,
-                    QStringLiteral("answered"));
+        deliverOutcome(entry);
         entry = Entry();
         lock.lock();
         delivering = false;
         if (pending.empty())
             changed.notify_all();
     }
+    deliverAllPending(lock);
 }
 
 QString LocalTunnel::errorString() const
@@ -397,13 +441,17 @@ void LocalTunnel::waitIdle()
 {
     State &state = *m_state;
     std::unique_lock<std::mutex> lock(state.mutex);
-    state.changed.wait(lock, [&] {
-        return (state.pending.empty() && !state.delivering) || !state.deliveryThread.joinable();
-    });
+    state.changed.wait(lock, [&] { return state.idle(); });
 }
 
-bool LocalTunnel::checkFaults(const QString &text, QString *error)
+bool LocalTunnel::waitIdle(std::chrono::milliseconds timeout)
 {
-    FaultPlan plan;
-    return plan.parse(text, error);
+    State &state = *m_state;
+    std::unique_lock<std::mutex> lock(state.mutex);
+    return state.changed.wait_for(lock, timeout, [&] { return state.idle(); });
+}
+
+std::optional<QString> LocalTunnel::faultTextError(const QString &text)
+{
+    return FaultPlan().parse(text);
 }

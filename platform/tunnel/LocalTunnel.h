@@ -5,18 +5,26 @@
 
 #include <QString>
 
+#include <chrono>
 #include <cstddef>
 #include <functional>
 #include <memory>
+#include <optional>
 
 // What the tunnel talks to: one request in, one answer out. Called only on
 // the tunnel's backend thread.
 using TunnelBackend = std::function<ServerAnswer(const QString &command, const QString &body)>;
+// What a backend factory makes: the backend, or (empty) why there is none.
+struct StartedBackend
+{
+    TunnelBackend backend;
+    QString error;
+};
 // Called once, on the backend thread, before any request: creates the
 // backend there (so a database connection lives on the thread that uses it).
-// An empty result (with *error set) leaves the tunnel disconnected. The
-// backend function is destroyed on the backend thread too.
-using TunnelBackendFactory = std::function<TunnelBackend(QString *error)>;
+// An empty backend leaves the tunnel disconnected. The backend function is
+// destroyed on the backend thread too.
+using TunnelBackendFactory = std::function<StartedBackend()>;
 
 struct LocalTunnelOptions
 {
@@ -61,8 +69,8 @@ public:
     LocalTunnel(const LocalTunnel &) = delete;
     LocalTunnel &operator=(const LocalTunnel &) = delete;
 
-    // Why the tunnel is not connected: the factory's error or a bad fault
-    // specification. Empty when connected.
+    // Why the tunnel is not connected: the factory's error or a fault text
+    // that does not parse. Empty when connected.
     QString errorString() const;
 
     bool IsConnected() const override;
@@ -77,11 +85,16 @@ public:
     // Do not call it from inside the task.
     bool runOnBackend(const std::function<void()> &task);
 
-    // Waits until every request taken so far has had its handler called.
+    // Waits until every request taken so far has had its handler called,
+    // requests sent by handlers meanwhile included; returns at once when
+    // the tunnel is not connected. The timed form is false when the time-out
+    // passed first.
     void waitIdle();
+    bool waitIdle(std::chrono::milliseconds timeout);
 
-    // Checks a fault specification; used by command lines before starting.
-    static bool checkFaults(const QString &text, QString *error);
+    // Why a fault text does not parse; nothing when it does. Command lines
+    // check their fault text with it before starting.
+    static std::optional<QString> faultTextError(const QString &text);
 
 private:
     struct State;

@@ -61,138 +61,147 @@ Options go before the command.
 Faults (--faults) are comma-separated, e.g. "latency=50ms,refuse=0.1,fail@3";
 the local tunnel's README lists them all.)";
 
-std::optional<qint64> wholeNumber(const QString &text, qint64 least, qint64 most)
+Result<qint64> wholeNumber(const QString &text, qint64 least, qint64 most, const char *mistake)
 {
     bool ok = false;
     const qint64 value = text.toLongLong(&ok);
     if (!ok || value < least || value > most)
-        return std::nullopt;
+        return Failure{QString::fromUtf8(mistake)};
     return value;
 }
 
-} // namespace
-
-std::optional<HostOptions> parseHostCommandLine(const QCoreApplication &app, QString *error)
+// The options plugin-host takes, known to one parser.
+struct HostParser
 {
+    HostParser();
+
     QCommandLineParser parser;
+    const QCommandLineOption help = parser.addHelpOption();
+    const QCommandLineOption version = parser.addVersionOption();
+    const QCommandLineOption plugin{
+        QStringLiteral("plugin"),
+        QStringLiteral("Plug-in library (default: the one beside the program)."),
+        QStringLiteral("FILE")};
+    const QCommandLineOption db{QStringLiteral("db"),
+                                QStringLiteral("The server's database (default: a file in the "
+                                               "user's data location, created on first use)."),
+                                QStringLiteral("FILE")};
+    const QCommandLineOption exchanges{QStringLiteral("exchanges"),
+                                       QStringLiteral("Append every tunnel exchange as one JSON "
+                                                      "line (command, identity, timeout, body, "
+                                                      "ok, code, content)."),
+                                       QStringLiteral("FILE")};
+    const QCommandLineOption layout{
+        QStringLiteral("answer-layout"),
+        QStringLiteral("compact | indented | crlf (the server's answer layout)."),
+        QStringLiteral("L"), QStringLiteral("compact")};
+    const QCommandLineOption faults{QStringLiteral("faults"),
+                                    QStringLiteral("The tunnel's fault injection (see above)."),
+                                    QStringLiteral("FAULTS")};
+    const QCommandLineOption seedFaults{
+        QStringLiteral("seed-faults"),
+        QStringLiteral("Seed of the fault injection's random choices."), QStringLiteral("N"),
+        QStringLiteral("1")};
+    const QCommandLineOption replyTimeout{
+        QStringLiteral("reply-timeout"),
+        QStringLiteral("How long to wait for each reply, in milliseconds."), QStringLiteral("MS"),
+        QStringLiteral("60000")};
+    const QCommandLineOption client{QStringLiteral("client"),
+                                    QStringLiteral("Default requester client identity."),
+                                    QStringLiteral("N"), QStringLiteral("1")};
+    const QCommandLineOption traceLevel{
+        QStringLiteral("trace-level"),
+        QStringLiteral("Write the plug-in's trace records up to level N to standard error."),
+        QStringLiteral("N")};
+};
+
+HostParser::HostParser()
+{
     parser.setApplicationDescription(QString::fromUtf8(Description));
     // Everything after the command word is its arguments: a payload such as
     // -1 is JSON, not an option.
     parser.setOptionsAfterPositionalArgumentsMode(QCommandLineParser::ParseAsPositionalArguments);
-    const QCommandLineOption help = parser.addHelpOption();
-    const QCommandLineOption version = parser.addVersionOption();
-
-    const QCommandLineOption plugin(QStringLiteral("plugin"),
-                                    QStringLiteral("Plug-in library (default: the one beside "
-                                                   "the program)."),
-                                    QStringLiteral("FILE"));
-    const QCommandLineOption db(QStringLiteral("db"),
-                                QStringLiteral("The server's database (default: a file in the "
-                                               "user's data location, created on first use)."),
-                                QStringLiteral("FILE"));
-    const QCommandLineOption exchanges(QStringLiteral("exchanges"),
-                                       QStringLiteral("Append every tunnel exchange as one JSON "
-                                                      "line (command, identity, timeout, body, "
-                                                      "ok, code, content)."),
-                                       QStringLiteral("FILE"));
-    const QCommandLineOption layout(QStringLiteral("answer-layout"),
-                                    QStringLiteral("compact | indented | crlf (the server's "
-                                                   "answer layout)."),
-                                    QStringLiteral("L"), QStringLiteral("compact"));
-    const QCommandLineOption faults(QStringLiteral("faults"),
-                                    QStringLiteral("The tunnel's fault injection (see above)."),
-                                    QStringLiteral("SPEC"));
-    const QCommandLineOption seedFaults(QStringLiteral("seed-faults"),
-                                        QStringLiteral("Seed of the fault injection's random "
-                                                       "choices."),
-                                        QStringLiteral("N"), QStringLiteral("1"));
-    const QCommandLineOption replyTimeout(QStringLiteral("reply-timeout"),
-                                          QStringLiteral("How long to wait for each reply, in "
-                                                         "milliseconds."),
-                                          QStringLiteral("MS"), QStringLiteral("60000"));
-    const QCommandLineOption client(QStringLiteral("client"),
-                                    QStringLiteral("Default requester client identity."),
-                                    QStringLiteral("N"), QStringLiteral("1"));
-    const QCommandLineOption traceLevel(QStringLiteral("trace-level"),
-                                        QStringLiteral("Write the plug-in's trace records up to "
-                                                       "level N to standard error."),
-                                        QStringLiteral("N"));
     parser.addOptions(
         {plugin, db, exchanges, layout, faults, seedFaults, replyTimeout, client, traceLevel});
     parser.addPositionalArgument(QStringLiteral("command"),
                                  QStringLiteral("request, session, seed, dump, raw or demo."),
                                  QStringLiteral("<command> [args]"));
+}
 
-    if (!parser.parse(app.arguments())) {
-        *error = parser.errorText();
-        return std::nullopt;
-    }
-    if (parser.isSet(help))
-        parser.showHelp(0);
-    if (parser.isSet(version))
-        parser.showVersion();
-
+// The command word and its arguments, checked against the table of commands.
+Result<HostOptions> readCommand(const QStringList &positional)
+{
+    if (positional.isEmpty())
+        return Failure{QStringLiteral("no command given; see --help")};
     HostOptions options;
-    const QStringList positional = parser.positionalArguments();
-    if (positional.isEmpty()) {
-        *error = QStringLiteral("no command given; see --help");
-        return std::nullopt;
-    }
     options.command = positional.first();
     options.arguments = positional.mid(1);
     const auto found = commands().find(options.command);
-    if (found == commands().end()) {
-        *error = QStringLiteral("unknown command \"%1\"; see --help").arg(options.command);
-        return std::nullopt;
-    }
+    if (found == commands().end())
+        return Failure{QStringLiteral("unknown command \"%1\"; see --help").arg(options.command)};
     for (const QString &argument : options.arguments) {
-        if (argument.startsWith(QLatin1String("--")) && argument.size() > 2) {
-            *error = QStringLiteral("options go before the command: %1").arg(argument);
-            return std::nullopt;
-        }
+        if (argument.startsWith(QLatin1String("--")) && argument.size() > 2)
+            return Failure{QStringLiteral("options go before the command: %1").arg(argument)};
     }
     const Arity arity = found->second;
-    if (options.arguments.size() < arity.least || options.arguments.size() > arity.most) {
-        *error = QStringLiteral("usage: plugin-host [options] %1").arg(arity.usage);
-        return std::nullopt;
-    }
+    if (options.arguments.size() < arity.least || options.arguments.size() > arity.most)
+        return Failure{QStringLiteral("usage: plugin-host [options] %1").arg(arity.usage)};
+    return options;
+}
 
-    options.pluginFile = parser.isSet(plugin)
-                             ? parser.value(plugin)
+// The options' values, added to the command's.
+Result<HostOptions> readOptions(const HostParser &host, HostOptions options)
+{
+    const QCommandLineParser &parser = host.parser;
+    options.pluginFile = parser.isSet(host.plugin)
+                             ? parser.value(host.plugin)
                              : QDir(QCoreApplication::applicationDirPath())
                                    .filePath(QStringLiteral(PLUGIN_HOST_DEFAULT_PLUGIN));
-    options.databaseFile = parser.value(db);
-    options.exchangesFile = parser.value(exchanges);
-    options.answerLayout = parser.value(layout);
-    options.faults = parser.value(faults);
+    options.databaseFile = parser.value(host.db);
+    options.exchangesFile = parser.value(host.exchanges);
+    options.answerLayout = parser.value(host.layout);
+    options.faults = parser.value(host.faults);
 
-    const std::optional<qint64> seed =
-        wholeNumber(parser.value(seedFaults), 0, std::numeric_limits<qint64>::max());
-    if (!seed) {
-        *error = QStringLiteral("--seed-faults takes a whole number of 0 or more");
-        return std::nullopt;
+    const std::optional<qint64> clientId = clientNumber(parser.value(host.client));
+    const bool traced = parser.isSet(host.traceLevel);
+    const Result<qint64> seed =
+        wholeNumber(parser.value(host.seedFaults), 0, std::numeric_limits<qint64>::max(),
+                    "--seed-faults takes a whole number of 0 or more");
+    const Result<qint64> timeout =
+        wholeNumber(parser.value(host.replyTimeout), 1, std::numeric_limits<qint32>::max(),
+                    "--reply-timeout takes a whole number of milliseconds, 1 or more");
+    const Result<qint64> client =
+        clientId ? Result<qint64>(*clientId)
+                 : Failure{QStringLiteral("--client takes a whole number from 0 to 2^53")};
+    const Result<qint64> level = traced ? wholeNumber(parser.value(host.traceLevel), 0, 255,
+                                                      "--trace-level takes a level from 0 to 255")
+                                        : Result<qint64>(0);
+    // In this order: the first mistake is the one reported.
+    for (const Result<qint64> *number : {&seed, &timeout, &client, &level}) {
+        if (!*number)
+            return Failure{number->error()};
     }
     options.faultSeed = static_cast<quint64>(*seed);
-    const std::optional<qint64> timeout =
-        wholeNumber(parser.value(replyTimeout), 1, std::numeric_limits<qint32>::max());
-    if (!timeout) {
-        *error = QStringLiteral("--reply-timeout takes a whole number of milliseconds, 1 or more");
-        return std::nullopt;
-    }
     options.replyTimeoutMs = static_cast<int>(*timeout);
-    const std::optional<qint64> clientId = clientNumber(parser.value(client));
-    if (!clientId) {
-        *error = QStringLiteral("--client takes a whole number from 0 to 2^53");
-        return std::nullopt;
-    }
-    options.client = *clientId;
-    if (parser.isSet(traceLevel)) {
-        const std::optional<qint64> level = wholeNumber(parser.value(traceLevel), 0, 255);
-        if (!level) {
-            *error = QStringLiteral("--trace-level takes a level from 0 to 255");
-            return std::nullopt;
-        }
+    options.client = *client;
+    if (traced)
         options.traceLevel = static_cast<int>(*level);
-    }
     return options;
+}
+
+} // namespace
+
+Result<HostOptions> parseHostCommandLine(const QCoreApplication &app)
+{
+    HostParser host;
+    if (!host.parser.parse(app.arguments()))
+        return Failure{host.parser.errorText()};
+    if (host.parser.isSet(host.help))
+        host.parser.showHelp(0);
+    if (host.parser.isSet(host.version))
+        host.parser.showVersion();
+    Result<HostOptions> command = readCommand(host.parser.positionalArguments());
+    if (!command)
+        return command;
+    return readOptions(host, std::move(*command));
 }

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "HostResult.h"
+
 #include <QString>
 #include <QStringList>
 
@@ -26,6 +28,6 @@ struct HostOptions
 };
 
 // Reads the command line of the running application. --help and --version
-// print and end the process with status 0; any other mistake gives nothing,
-// with the message for standard error in *error.
-std::optional<HostOptions> parseHostCommandLine(const QCoreApplication &app, QString *error);
+// print and end the process with status 0; any other mistake gives the
+// message for standard error.
+Result<HostOptions> parseHostCommandLine(const QCoreApplication &app);

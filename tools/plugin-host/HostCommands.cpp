@@ -7,7 +7,6 @@
 #include "HostRequest.h"
 #include "JsonValues.h"
 #include "LocalTunnel.h"
-#include "PendingExchanges.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "RecordingServer.h"
 #include "RequestRunner.h"
@@ -21,27 +20,23 @@
 
 namespace {
 
-// Reads a whole file, or standard input for "-"; nothing, with the message,
-// when it cannot be read.
-std::optional<QByteArray> readInput(const QString &fileName, QString *error)
+// Reads a whole file, or standard input for "-".
+Result<QByteArray> readInput(const QString &fileName)
 {
     QFile file;
     const bool opened = fileName == QLatin1String("-")
                             ? file.open(stdin, QIODevice::ReadOnly)
                             : (file.setFileName(fileName), file.open(QIODevice::ReadOnly));
-    if (!opened) {
-        *error = QStringLiteral("%1: %2").arg(fileName, file.errorString());
-        return std::nullopt;
-    }
+    if (!opened)
+        return Failure{QStringLiteral("%1: %2").arg(fileName, file.errorString())};
     return file.readAll();
 }
 
 int runRequests(const HostOptions &options, const std::vector<HostRequest> &requests)
 {
     HostPlatform platform(options);
-    QString error;
-    if (!platform.start(&error)) {
-        printError(error);
+    if (const std::optional<Failure> failure = platform.start()) {
+        printError(failure->message);
         return ExitUsage;
     }
     RequestRunner runner(platform);
@@ -51,25 +46,16 @@ int runRequests(const HostOptions &options, const std::vector<HostRequest> &requ
 
 // Opens the server's database on this thread, for the commands that work on
 // it without the plug-in.
-bool openServer(const HostOptions &options, RecordingServer **server,
-                std::unique_ptr<RecordingServer> *holder)
+Result<std::shared_ptr<RecordingServer>> openServer(const HostOptions &options)
 {
-    AnswerLayout layout = AnswerLayout::Compact;
-    if (!parseAnswerLayout(options.answerLayout, &layout)) {
-        printError(QStringLiteral("--answer-layout takes compact, indented or crlf, not \"%1\"")
-                       .arg(options.answerLayout));
-        return false;
-    }
-    const QString database =
-        options.databaseFile.isEmpty() ? defaultDatabasePath() : options.databaseFile;
-    *holder = std::make_unique<RecordingServer>(database, layout);
+    const Result<AnswerLayout> layout = answerLayout(options);
+    if (!layout)
+        return Failure{layout.error()};
+    auto server = std::make_shared<RecordingServer>(databasePath(options), *layout);
     QString error;
-    if (!(*holder)->open(&error)) {
-        printError(QStringLiteral("the server's database does not open: %1").arg(error));
-        return false;
-    }
-    *server = holder->get();
-    return true;
+    if (!server->open(&error))
+        return Failure{QStringLiteral("the server's database does not open: %1").arg(error)};
+    return server;
 }
 
 // The one answer of a raw exchange, which the tunnel delivers on its thread.
@@ -148,11 +134,9 @@ int runRequest(const HostOptions &options)
     HostRequest request;
     request.command = options.arguments.at(0);
     if (options.arguments.size() > 1) {
-        QString error;
-        const std::optional<QJsonValue> payload =
-            JsonValues::parse(options.arguments.at(1).toUtf8(), &error);
+        const Result<QJsonValue> payload = JsonValues::parse(options.arguments.at(1).toUtf8());
         if (!payload) {
-            printError(QStringLiteral("PAYLOAD is not JSON: %1").arg(error));
+            printError(QStringLiteral("PAYLOAD is not JSON: %1").arg(payload.error()));
             return ExitUsage;
         }
         request.payload = payload->toVariant();
@@ -164,16 +148,16 @@ int runSession(const HostOptions &options)
 {
     const QString fileName =
         options.arguments.isEmpty() ? QStringLiteral("-") : options.arguments.first();
-    QString error;
-    const std::optional<QByteArray> text = readInput(fileName, &error);
+    const Result<QByteArray> text = readInput(fileName);
     if (!text) {
-        printError(error);
+        printError(text.error());
         return ExitUsage;
     }
-    const std::optional<std::vector<HostRequest>> requests = readSession(*text, &error);
+    const Result<std::vector<HostRequest>> requests = readSession(*text);
     if (!requests) {
         printError(QStringLiteral("%1: %2").arg(
-            fileName == QLatin1String("-") ? QStringLiteral("standard input") : fileName, error));
+            fileName == QLatin1String("-") ? QStringLiteral("standard input") : fileName,
+            requests.error()));
         return ExitUsage;
     }
     return runRequests(options, *requests);
@@ -181,17 +165,18 @@ int runSession(const HostOptions &options)
 
 int runSeed(const HostOptions &options)
 {
-    QString error;
-    const std::optional<QByteArray> xml = readInput(options.arguments.first(), &error);
+    const Result<QByteArray> xml = readInput(options.arguments.first());
     if (!xml) {
-        printError(error);
+        printError(xml.error());
         return ExitUsage;
     }
-    RecordingServer *server = nullptr;
-    std::unique_ptr<RecordingServer> holder;
-    if (!openServer(options, &server, &holder))
+    const Result<std::shared_ptr<RecordingServer>> server = openServer(options);
+    if (!server) {
+        printError(server.error());
         return ExitUsage;
-    if (!server->seed(QString::fromUtf8(*xml), &error)) {
+    }
+    QString error;
+    if (!(*server)->seed(QString::fromUtf8(*xml), &error)) {
         printError(QStringLiteral("%1: %2").arg(options.arguments.first(), error));
         return ExitUsage;
     }
@@ -200,11 +185,12 @@ int runSeed(const HostOptions &options)
 
 int runDump(const HostOptions &options)
 {
-    RecordingServer *server = nullptr;
-    std::unique_ptr<RecordingServer> holder;
-    if (!openServer(options, &server, &holder))
+    const Result<std::shared_ptr<RecordingServer>> server = openServer(options);
+    if (!server) {
+        printError(server.error());
         return ExitUsage;
-    QByteArray text = server->dump().toUtf8();
+    }
+    QByteArray text = (*server)->dump().toUtf8();
     if (text.endsWith('\n'))
         text.chop(1);
     printLine(text);
@@ -216,18 +202,17 @@ int runRaw(const HostOptions &options)
     // Outlives the platform, whose tunnel answers a late exchange as it stops.
     RawAnswer answer;
     HostPlatform platform(options);
-    QString error;
-    if (!platform.startTunnel(&error)) {
-        printError(error);
+    if (const std::optional<Failure> failure = platform.startTunnel()) {
+        printError(failure->message);
         return ExitUsage;
     }
     TunnelRequest request;
     request.timeoutMs = options.replyTimeoutMs;
     request.body = options.arguments.at(1);
     request.onResponse = answer.handler();
-    const bool taken = platform.exchanges().SendRequest(
-        PluginRecordingScheduleSettingCommon::PluginId, Requesters::identityOf(options.client), 1,
-        options.arguments.at(0), request);
+    const bool taken = platform.tunnel().SendRequest(PluginRecordingScheduleSettingCommon::PluginId,
+                                                     Requesters::identityOf(options.client), 1,
+                                                     options.arguments.at(0), request);
     if (!taken) {
         printError(QStringLiteral("the tunnel did not take the request"));
         return ExitReplies;
@@ -237,7 +222,7 @@ int runRaw(const HostOptions &options)
         return ExitReplies;
     }
     printLine(answer.line());
-    platform.exchanges().waitIdle(RawAnswerGrace);
+    platform.tunnel().waitIdle(RawAnswerGrace);
     if (answer.count() > 1) {
         printError(QStringLiteral("%1 answers to one request").arg(answer.count()));
         return ExitReplies;

@@ -95,7 +95,7 @@ public:
                 ? QString::fromUtf8(JsonValues::compact(QJsonValue::fromVariant(request.payload)))
                 : QString();
         printText(QStringLiteral("> %1 %2").arg(command, shown).trimmed());
-        const std::optional<ReplyCollector::Reply> reply = m_runner.send(request);
+        std::optional<ReplyCollector::Reply> reply = m_runner.send(request);
         if (!reply) {
             m_failed = true;
             return std::nullopt;
@@ -183,6 +183,30 @@ private:
     bool m_failed = false;
 };
 
+// Moves C_2 from the default event schedule to "Lobby"; false when the
+// story cannot go on.
+bool moveToLobby(DemoStory &story)
+{
+    const std::optional<QString> lobby = story.idOf(QStringLiteral("Lobby"));
+    const std::optional<QString> event =
+        story.idOf(QStringLiteral("KOLT2 Default Event Recording"));
+    story.heading(QStringLiteral("Move C_2 from the default event schedule to \"Lobby\""));
+    if (lobby && event) {
+        const QVariantList moved{camera("C_2", "1")};
+        const QVariantMap from{{QStringLiteral("scheduleID"), *event},
+                               {QStringLiteral("camIDList"), moved}};
+        const QVariantMap to{{QStringLiteral("scheduleID"), *lobby},
+                             {QStringLiteral("camIDList"), moved}};
+        return story
+            .step(QStringLiteral("UpdateCamRecSchedule"),
+                  {{QStringLiteral("scheduleRmvCam"), QVariantList{from}},
+                   {QStringLiteral("scheduleAddCam"), QVariantList{to}}})
+            .has_value();
+    }
+    story.say(QStringLiteral("  (skipped: the schedules to move between are not there)"));
+    return true;
+}
+
 void tell(DemoStory &story)
 {
     story.heading(QStringLiteral("A fresh recording server holds its default time card"));
@@ -207,23 +231,8 @@ void tell(DemoStory &story)
                     {{QStringLiteral("camRecGroupList"), demoCameras()}}))
         return;
 
-    const std::optional<QString> lobby = story.idOf(QStringLiteral("Lobby"));
-    const std::optional<QString> event =
-        story.idOf(QStringLiteral("KOLT2 Default Event Recording"));
-    story.heading(QStringLiteral("Move C_2 from the default event schedule to \"Lobby\""));
-    if (lobby && event) {
-        const QVariantList moved{camera("C_2", "1")};
-        const QVariantMap from{{QStringLiteral("scheduleID"), *event},
-                               {QStringLiteral("camIDList"), moved}};
-        const QVariantMap to{{QStringLiteral("scheduleID"), *lobby},
-                             {QStringLiteral("camIDList"), moved}};
-        if (!story.step(QStringLiteral("UpdateCamRecSchedule"),
-                        {{QStringLiteral("scheduleRmvCam"), QVariantList{from}},
-                         {QStringLiteral("scheduleAddCam"), QVariantList{to}}}))
-            return;
-    } else {
-        story.say(QStringLiteral("  (skipped: the schedules to move between are not there)"));
-    }
+    if (!moveToLobby(story))
+        return;
 
     story.heading(QStringLiteral("Which schedule is in force? Two time cards hold cameras, "
                                  "so the answer is 4 (more than one)"));
@@ -254,9 +263,8 @@ int runDemo(const HostOptions &options)
     demoOptions.databaseFile = folder.filePath(QStringLiteral("demo.sqlite"));
 
     HostPlatform platform(demoOptions);
-    QString error;
-    if (!platform.start(&error)) {
-        printError(error);
+    if (const std::optional<Failure> failure = platform.start()) {
+        printError(failure->message);
         return ExitUsage;
     }
     DemoStory story(platform);

@@ -3,7 +3,6 @@
 #include "IPluginObjectBase.h"
 #include "LocalFrameworkTools.h"
 #include "LocalTunnel.h"
-#include "PendingExchanges.h"
 #include "PluginLibrary.h"
 #include "RecordingScheduleSettingConstants.h"
 
@@ -18,62 +17,53 @@ HostPlatform::~HostPlatform()
     m_library.reset();
     m_framework.reset();
     m_tunnel.reset();
-    m_exchanges.reset();
 }
 
-bool HostPlatform::loadPlugin(QString *error)
+std::optional<Failure> HostPlatform::loadPlugin()
 {
     m_library = std::make_unique<PluginLibrary>(m_options.pluginFile,
                                                 QStringLiteral(PLUGIN_SERVER_INTERFACE_IID),
                                                 PluginRecordingScheduleSettingCommon::PluginId);
     if (m_library->load())
-        return true;
-    *error = QStringLiteral("the plug-in does not load: %1").arg(m_library->errorString());
-    return false;
+        return std::nullopt;
+    return Failure{QStringLiteral("the plug-in does not load: %1").arg(m_library->errorString())};
 }
 
-bool HostPlatform::startTunnel(QString *error)
+std::optional<Failure> HostPlatform::startTunnel()
 {
-    AnswerLayout layout = AnswerLayout::Compact;
-    if (!parseAnswerLayout(m_options.answerLayout, &layout)) {
-        *error = QStringLiteral("--answer-layout takes compact, indented or crlf, not \"%1\"")
-                     .arg(m_options.answerLayout);
-        return false;
-    }
-    QString reason;
-    if (!LocalTunnel::checkFaults(m_options.faults, &reason)) {
-        *error = QStringLiteral("--faults: %1").arg(reason);
-        return false;
-    }
-    const QString database =
-        m_options.databaseFile.isEmpty() ? defaultDatabasePath() : m_options.databaseFile;
+    const Result<AnswerLayout> layout = answerLayout(m_options);
+    if (!layout)
+        return Failure{layout.error()};
+    if (const std::optional<QString> reason = LocalTunnel::faultTextError(m_options.faults))
+        return Failure{QStringLiteral("--faults: %1").arg(*reason)};
 
     LocalTunnelOptions tunnelOptions;
     tunnelOptions.faults = m_options.faults;
     tunnelOptions.faultSeed = m_options.faultSeed;
     tunnelOptions.exchangeLogPath = m_options.exchangesFile;
-    m_tunnel =
-        std::make_unique<LocalTunnel>(recordingServerBackend(database, layout), tunnelOptions);
-    if (!m_tunnel->IsConnected()) {
-        *error = QStringLiteral("the server does not start: %1").arg(m_tunnel->errorString());
-        return false;
-    }
-    m_exchanges = std::make_unique<PendingExchanges>(m_tunnel.get());
-    return true;
+    m_tunnel = std::make_unique<LocalTunnel>(
+        recordingServerBackend(databasePath(m_options), *layout), tunnelOptions);
+    if (!m_tunnel->IsConnected())
+        return Failure{
+            QStringLiteral("the server does not start: %1").arg(m_tunnel->errorString())};
+    return std::nullopt;
 }
 
-bool HostPlatform::initialisePlugin(QString *error)
+std::optional<Failure> HostPlatform::initialisePlugin()
 {
-    m_framework = std::make_unique<LocalFrameworkTools>(m_exchanges.get());
+    m_framework = std::make_unique<LocalFrameworkTools>(m_tunnel.get());
     if (plugin()->InitialPluginBase(m_framework.get()))
-        return true;
-    *error = QStringLiteral("the plug-in refused to initialise");
-    return false;
+        return std::nullopt;
+    return Failure{QStringLiteral("the plug-in refused to initialise")};
 }
 
-bool HostPlatform::start(QString *error)
+std::optional<Failure> HostPlatform::start()
 {
-    return loadPlugin(error) && startTunnel(error) && initialisePlugin(error);
+    if (std::optional<Failure> failure = loadPlugin())
+        return failure;
+    if (std::optional<Failure> failure = startTunnel())
+        return failure;
+    return initialisePlugin();
 }
 
 IPluginObjectBase *HostPlatform::plugin() const
@@ -81,9 +71,20 @@ IPluginObjectBase *HostPlatform::plugin() const
     return m_library ? m_library->plugin() : nullptr;
 }
 
-QString defaultDatabasePath()
+QString databasePath(const HostOptions &options)
 {
+    if (!options.databaseFile.isEmpty())
+        return options.databaseFile;
     const QString folder = QStandardPaths::writableLocation(QStandardPaths::AppDataLocation);
     QDir().mkpath(folder);
     return QDir(folder).filePath(QStringLiteral("recording-server.sqlite"));
+}
+
+Result<AnswerLayout> answerLayout(const HostOptions &options)
+{
+    AnswerLayout layout = AnswerLayout::Compact;
+    if (!parseAnswerLayout(options.answerLayout, &layout))
+        return Failure{QStringLiteral("--answer-layout takes compact, indented or crlf, not \"%1\"")
+                           .arg(options.answerLayout)};
+    return layout;
 }

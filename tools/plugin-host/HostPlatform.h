@@ -1,18 +1,20 @@
 #pragma once
 
 #include "HostCommandLine.h"
+#include "HostResult.h"
 #include "ReplyCollector.h"
 #include "Requesters.h"
 
 #include <QString>
 
 #include <memory>
+#include <optional>
 
 class IPluginObjectBase;
 class LocalFrameworkTools;
 class LocalTunnel;
-class PendingExchanges;
 class PluginLibrary;
+enum class AnswerLayout;
 
 // The platform of one plugin-host run: the plug-in file, the simulated
 // recording server behind the local tunnel, and the host's side of requests.
@@ -28,18 +30,19 @@ public:
     HostPlatform(const HostPlatform &) = delete;
     HostPlatform &operator=(const HostPlatform &) = delete;
 
+    // Each step gives why it failed, or nothing.
     // Loads and checks the plug-in file; nothing of the server is touched.
-    bool loadPlugin(QString *error);
+    std::optional<Failure> loadPlugin();
     // Opens the server's database behind a local tunnel.
-    bool startTunnel(QString *error);
+    std::optional<Failure> startTunnel();
     // Hands the plug-in the framework with the tunnel.
-    bool initialisePlugin(QString *error);
+    std::optional<Failure> initialisePlugin();
     // The three steps above, in order, up to the first that fails.
-    bool start(QString *error);
+    std::optional<Failure> start();
 
     IPluginObjectBase *plugin() const;
-    // The tunnel as the plug-in sees it: every exchange is counted.
-    PendingExchanges &exchanges() { return *m_exchanges; }
+    // The tunnel the plug-in is given; waitIdle() on it waits until every
+    // answer handler (and the replies it gave) has run.
     LocalTunnel &tunnel() { return *m_tunnel; }
     ReplyCollector &replies() { return m_replies; }
     Requesters &requesters() { return m_requesters; }
@@ -51,11 +54,12 @@ private:
     ReplyCollector m_replies;
     Requesters m_requesters;
     std::unique_ptr<LocalTunnel> m_tunnel;
-    std::unique_ptr<PendingExchanges> m_exchanges;
     std::unique_ptr<LocalFrameworkTools> m_framework;
     std::unique_ptr<PluginLibrary> m_library;
 };
 
-// The database file when --db is not given, in the user's data location;
-// its folder is created.
-QString defaultDatabasePath();
+// The server's database: --db, or a file in the user's data location, whose
+// folder is created.
+QString databasePath(const HostOptions &options);
+// The server's answer layout that --answer-layout names.
+Result<AnswerLayout> answerLayout(const HostOptions &options);

@@ -14,40 +14,32 @@ const QString CommandKey = QStringLiteral("command");
 const QString PayloadKey = QStringLiteral("payload");
 const QString ClientKey = QStringLiteral("client");
 
-std::optional<HostRequest> readLine(const QByteArray &line, QString *error)
+Result<HostRequest> readLine(const QByteArray &line)
 {
-    const std::optional<QJsonValue> value = JsonValues::parse(line, error);
+    const Result<QJsonValue> value = JsonValues::parse(line);
     if (!value)
-        return std::nullopt;
-    if (!value->isObject()) {
-        *error = QStringLiteral("a request is a JSON object");
-        return std::nullopt;
-    }
+        return Failure{value.error()};
+    if (!value->isObject())
+        return Failure{QStringLiteral("a request is a JSON object")};
     const QJsonObject object = value->toObject();
     for (auto it = object.begin(); it != object.end(); ++it) {
         // A misspelt key would otherwise send the request without what it
         // was meant to carry.
-        if (it.key() != CommandKey && it.key() != PayloadKey && it.key() != ClientKey) {
-            *error = QStringLiteral("unknown key \"%1\"").arg(it.key());
-            return std::nullopt;
-        }
+        if (it.key() != CommandKey && it.key() != PayloadKey && it.key() != ClientKey)
+            return Failure{QStringLiteral("unknown key \"%1\"").arg(it.key())};
     }
     HostRequest request;
     const QJsonValue command = object.value(CommandKey);
-    if (!command.isString()) {
-        *error = QStringLiteral("\"command\" must be a string");
-        return std::nullopt;
-    }
+    if (!command.isString())
+        return Failure{QStringLiteral("\"command\" must be a string")};
     request.command = command.toString();
     if (object.contains(PayloadKey))
         request.payload = object.value(PayloadKey).toVariant();
     if (object.contains(ClientKey)) {
         const QJsonValue client = object.value(ClientKey);
         request.client = client.isDouble() ? clientNumber(client.toDouble()) : std::nullopt;
-        if (!request.client) {
-            *error = QStringLiteral("\"client\" must be a whole number from 0 to 2^53");
-            return std::nullopt;
-        }
+        if (!request.client)
+            return Failure{QStringLiteral("\"client\" must be a whole number from 0 to 2^53")};
     }
     return request;
 }
@@ -70,7 +62,7 @@ std::optional<qint64> clientNumber(const QString &text)
     return value;
 }
 
-std::optional<std::vector<HostRequest>> readSession(const QByteArray &text, QString *error)
+Result<std::vector<HostRequest>> readSession(const QByteArray &text)
 {
     std::vector<HostRequest> requests;
     QByteArray body = text;
@@ -81,12 +73,9 @@ std::optional<std::vector<HostRequest>> readSession(const QByteArray &text, QStr
         const QByteArray line = lines.at(i).trimmed();
         if (line.isEmpty())
             continue;
-        QString reason;
-        std::optional<HostRequest> request = readLine(line, &reason);
-        if (!request) {
-            *error = QStringLiteral("line %1: %2").arg(i + 1).arg(reason);
-            return std::nullopt;
-        }
+        Result<HostRequest> request = readLine(line);
+        if (!request)
+            return Failure{QStringLiteral("line %1: %2").arg(i + 1).arg(request.error())};
         requests.push_back(std::move(*request));
     }
     return requests;

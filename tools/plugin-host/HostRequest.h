@@ -1,5 +1,7 @@
 #pragma once
 
+#include "HostResult.h"
+
 #include <QByteArray>
 #include <QString>
 #include <QVariant>
@@ -24,6 +26,6 @@ std::optional<qint64> clientNumber(const QString &text);
 // Reads a session: JSON Lines, one object per line,
 // {"command": NAME, "payload": VALUE, "client": N}, "payload" and "client"
 // optional; blank lines are skipped. The whole text is checked before
-// anything is sent, so a bad line sends nothing: nothing, with
-// "line N: reason" in *error.
-std::optional<std::vector<HostRequest>> readSession(const QByteArray &text, QString *error);
+// anything is sent, so a bad line sends nothing: the requests, or
+// "line N: reason".
+Result<std::vector<HostRequest>> readSession(const QByteArray &text);

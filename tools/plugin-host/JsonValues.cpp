@@ -7,27 +7,22 @@
 
 namespace JsonValues {
 
-std::optional<QJsonValue> parse(const QByteArray &text, QString *error)
+Result<QJsonValue> parse(const QByteArray &text)
 {
     // QJsonDocument takes only objects and arrays; a scalar is read inside
     // an array of one.
     QJsonParseError parseError{};
     const QJsonDocument document = QJsonDocument::fromJson(
         QByteArrayLiteral("[") + text + QByteArrayLiteral("]"), &parseError);
-    if (parseError.error != QJsonParseError::NoError) {
-        if (error)
-            *error = QStringLiteral("%1 at character %2")
-                         .arg(parseError.errorString())
-                         .arg(qMax(0, parseError.offset - 1));
-        return std::nullopt;
-    }
+    if (parseError.error != QJsonParseError::NoError)
+        return Failure{QStringLiteral("%1 at character %2")
+                           .arg(parseError.errorString())
+                           .arg(qMax(0, parseError.offset - 1))};
     const QJsonArray values = document.array();
-    if (values.size() != 1) {
-        if (error)
-            *error = values.isEmpty() ? QStringLiteral("no JSON value")
-                                      : QStringLiteral("more than one JSON value");
-        return std::nullopt;
-    }
+    if (values.isEmpty())
+        return Failure{QStringLiteral("no JSON value")};
+    if (values.size() > 1)
+        return Failure{QStringLiteral("more than one JSON value")};
     return values.first();
 }
 

@@ -4,7 +4,7 @@
 #include "HostOutput.h"
 #include "HostPlatform.h"
 #include "IPluginObjectBase.h"
-#include "PendingExchanges.h"
+#include "LocalTunnel.h"
 #include "ReplyLine.h"
 
 #include <chrono>
@@ -61,7 +61,7 @@ void RequestRunner::run(const std::vector<HostRequest> &requests)
 int RequestRunner::finish()
 {
     const auto timeout = std::chrono::milliseconds(m_platform.options().replyTimeoutMs);
-    m_platform.exchanges().waitIdle(timeout);
+    m_platform.tunnel().waitIdle(timeout);
     int status = m_unanswered ? ExitReplies : ExitOk;
     for (const int number : m_platform.replies().answeredMoreThanOnce()) {
         printError(QStringLiteral("request %1 (%2): %3 replies")

@@ -46,18 +46,18 @@ QChar cell(const std::map<QString, WeekMinutes> &modes, int day, int hour)
     return found > 1 ? QLatin1Char('*') : mark;
 }
 
-} // namespace
-
-QStringList weekGrid(const QString &content)
+// The minutes each mode records in, and a line for each frame that does
+// not repeat weekly.
+struct Week
 {
-    const QJsonDocument document = QJsonDocument::fromJson(content.toUtf8());
-    if (!document.isObject() || !document.object().value(QStringLiteral("Rectangles")).isArray())
-        return {QStringLiteral("(no schedule content)")};
-
     std::map<QString, WeekMinutes> modes;
     QStringList notWeekly;
-    for (const QJsonValue &value :
-         document.object().value(QStringLiteral("Rectangles")).toArray()) {
+};
+
+Week readWeek(const QJsonArray &rectangles)
+{
+    Week week;
+    for (const auto &value : rectangles) {
         const QJsonObject rectangle = value.toObject();
         const QString mode = rectangle.value(QStringLiteral("RecordingMode")).toString();
         const int left = rectangle.value(QStringLiteral("Left")).toInt(-1);
@@ -65,15 +65,27 @@ QStringList weekGrid(const QString &content)
         const double top = rectangle.value(QStringLiteral("Top")).toDouble(-1);
         const double bottom = rectangle.value(QStringLiteral("Bottom")).toDouble(-1);
         if (left < 0 || right < 0 || top < 0 || bottom < 0) {
-            notWeekly << QStringLiteral("not weekly: %1").arg(mode.isEmpty() ? "(no mode)" : mode);
+            week.notWeekly
+                << QStringLiteral("not weekly: %1").arg(mode.isEmpty() ? "(no mode)" : mode);
             continue;
         }
-        WeekMinutes &week = modes[mode];
+        WeekMinutes &minutes = week.modes[mode];
         for (int day = std::max(left, 0); day < std::min(right, Days); ++day) {
             for (int minute = toMinute(top); minute < toMinute(bottom); ++minute)
-                week[day].set(minute);
+                minutes[day].set(minute);
         }
     }
+    return week;
+}
+
+} // namespace
+
+QStringList weekGrid(const QString &content)
+{
+    const QJsonDocument document = QJsonDocument::fromJson(content.toUtf8());
+    if (!document.isObject() || !document.object().value(QStringLiteral("Rectangles")).isArray())
+        return {QStringLiteral("(no schedule content)")};
+    const Week week = readWeek(document.object().value(QStringLiteral("Rectangles")).toArray());
 
     QStringList lines;
     QString header = QStringLiteral("       ");
@@ -83,9 +95,9 @@ QStringList weekGrid(const QString &content)
     for (int hour = 0; hour < Hours; ++hour) {
         QString line = QStringLiteral("%1:00  ").arg(hour, 2, 10, QLatin1Char('0'));
         for (int day = 0; day < Days; ++day)
-            line += QStringLiteral("  ") + cell(modes, day, hour);
+            line += QStringLiteral("  ") + cell(week.modes, day, hour);
         lines << line;
     }
-    lines << notWeekly;
+    lines << week.notWeekly;
     return lines;
 }

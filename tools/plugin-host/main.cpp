@@ -15,10 +15,9 @@ int main(int argc, char *argv[])
     QCoreApplication::setApplicationName(QStringLiteral("plugin-host"));
     QCoreApplication::setApplicationVersion(QStringLiteral(PLUGIN_HOST_VERSION));
 
-    QString error;
-    const std::optional<HostOptions> options = parseHostCommandLine(app, &error);
+    const Result<HostOptions> options = parseHostCommandLine(app);
     if (!options) {
-        printError(error);
+        printError(options.error());
         return ExitUsage;
     }
     // Before the plug-in loads: it opens the trace-log library as it loads.
