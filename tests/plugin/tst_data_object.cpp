@@ -1,5 +1,5 @@
-// The schedule data object as the host streams it: every row ends with the
-// object written out, so each row shows the bytes the host would carry.
+// The schedule data object as the host streams it. Each row acts on an object
+// of type 5 holding "before", then writes it out: the bytes the host carries.
 
 #include "RecordingScheduleDataObject.h"
 
@@ -11,48 +11,48 @@
 
 using namespace Qt::StringLiterals;
 using PluginRecordingScheduleSettingCommon::RecordingScheduleType;
+using Object = RecordingScheduleDataObject;
 
 namespace {
 
-class ForeignObject final : public IRawDataObject
+struct Foreign final : IRawDataObject
 {
-public:
     void ReadDataFromDataStream(QDataStream &) override {}
     void WriteDataToDataStream(QDataStream &) const override {}
 };
 
-RecordingScheduleDataObject made(int type, const QString &content)
+Object made(int type, const QString &content)
 {
-    RecordingScheduleDataObject object;
+    Object object;
     object.setRecScheduleType(static_cast<RecordingScheduleType>(type));
     object.setCustomizeContent(content);
     return object;
 }
 
-void readFrom(RecordingScheduleDataObject &object, const char *hex)
+void read(Object &object, const char *hex)
 {
     QDataStream stream(QByteArray::fromHex(hex));
     object.ReadDataFromDataStream(stream);
 }
 
+void assign(IRawDataObject &to, const IRawDataObject &from)
+{
+    to = from;
+}
+
 struct Row
 {
     const char *name;
-    std::function<void(RecordingScheduleDataObject &)> act; // on a type 5 "before" object
-    QByteArray written;                                     // hex
+    std::function<void(Object &)> act;
+    QByteArray written; // in hex
 };
-
-void PrintTo(const Row &row, std::ostream *os)
-{
-    *os << row.name;
-}
 
 class DataObject : public ::testing::TestWithParam<Row>
 {};
 
-TEST_P(DataObject, StreamsAsExpected)
+TEST_P(DataObject, IsWrittenAs)
 {
-    RecordingScheduleDataObject object = made(5, u"before"_s);
+    Object object = made(5, u"before"_s);
     GetParam().act(object);
     QByteArray bytes;
     QDataStream stream(&bytes, QIODeviceBase::WriteOnly);
@@ -60,31 +60,24 @@ TEST_P(DataObject, StreamsAsExpected)
     EXPECT_EQ(bytes.toHex(), GetParam().written);
 }
 
+const QByteArray Before = "000000050000000c006200650066006f00720065";
+
 const Row Rows[] = {
-    {"new_object_is_type_0_without_content",
-     [](RecordingScheduleDataObject &o) { o = RecordingScheduleDataObject(); }, "00000000ffffffff"},
-    {"customised_schedule_is_the_int_then_the_string",
-     [](RecordingScheduleDataObject &o) { o = made(2, u"ab"_s); }, "000000020000000400610062"},
-    {"what_was_written_reads_back", [](auto &o) { readFrom(o, "000000020000000400610062"); },
+    {"a_new_object_is_type_0_without_content", [](Object &o) { o = Object(); }, "00000000ffffffff"},
+    {"the_int_then_the_string", [](Object &o) { o = made(2, u"ab"_s); },
      "000000020000000400610062"},
-    {"a_type_no_enumerator_names_is_kept", [](auto &o) { readFrom(o, "7fffffffffffffff"); },
+    {"what_was_written_reads_back", [](Object &o) { read(o, "000000020000000400610062"); },
+     "000000020000000400610062"},
+    {"a_type_no_enumerator_names_is_kept", [](Object &o) { read(o, "7fffffffffffffff"); },
      "7fffffffffffffff"},
-    {"a_stream_ending_inside_the_int_leaves_type_0", [](auto &o) { readFrom(o, "0000"); },
+    {"a_stream_ending_inside_the_int_leaves_type_0", [](Object &o) { read(o, "0000"); },
      "0000000000000000"},
-    {"assigning_through_the_interface_copies_both_fields",
-     [](RecordingScheduleDataObject &o) {
-         static_cast<IRawDataObject &>(o) = static_cast<const IRawDataObject &>(made(1, u"a"_s));
-     },
-     "00000001000000020061"},
-    {"assigning_itself_changes_nothing",
-     [](RecordingScheduleDataObject &o) {
-         static_cast<IRawDataObject &>(o) = static_cast<const IRawDataObject &>(o);
-     },
-     "000000050000000c006200650066006f00720065"},
+    {"assignment_through_the_interface_copies_both_fields",
+     [](Object &o) { assign(o, made(1, u"a"_s)); }, "00000001000000020061"},
+    {"assignment_of_itself_changes_nothing", [](Object &o) { assign(o, o); }, Before},
     // The failed cast inside the assignment is caught: nothing escapes.
-    {"assigning_another_kind_of_data_object_changes_nothing",
-     [](RecordingScheduleDataObject &o) { static_cast<IRawDataObject &>(o) = ForeignObject(); },
-     "000000050000000c006200650066006f00720065"},
+    {"assignment_of_another_kind_of_data_object_changes_nothing",
+     [](Object &o) { assign(o, Foreign()); }, Before},
 };
 
 INSTANTIATE_TEST_SUITE_P(Frame, DataObject, ::testing::ValuesIn(Rows),

@@ -27,6 +27,8 @@ struct CountingResponser final : IResponser
     void Respond(bool, const QString &, const QString &, const QVariant &) override { ++calls; }
 };
 
+enum Call { Nothing, NoTools, NoTunnel, Tunnel, Request, Block, Subscribe, Unsubscribe, Delete };
+
 class Frame : public ::testing::Test
 {
 protected:
@@ -52,12 +54,10 @@ protected:
     {
         QFile file(logFile());
         QStringList result;
-        for (const QString &line : file.open(QIODevice::ReadOnly)
-                                       ? QString::fromUtf8(file.readAll()).split(u'\n')
-                                       : QStringList()) {
-            if (!line.isEmpty())
-                result << line.section(u' ', 2, 2) + u' ' + line.section(u' ', 4);
-        }
+        file.open(QIODevice::ReadOnly);
+        for (const QString &line :
+             QString::fromUtf8(file.readAll()).split(u'\n', Qt::SkipEmptyParts))
+            result << line.section(u' ', 2, 2) + u' ' + line.section(u' ', 4);
         return result;
     }
 
@@ -65,6 +65,11 @@ protected:
     // The next test gets a new plug-in object.
     void TearDown() override { delete loader().instance(); }
 
+    bool initialise(int call)
+    {
+        IFrameworkTools *const given[] = {nullptr, &noTunnel, &tools};
+        return plugin()->InitialPluginBase(given[call - NoTools]);
+    }
     IPluginObjectBase *plugin() { return qobject_cast<IPluginObjectBase *>(loader().instance()); }
 
     TestTunnel tunnel;
@@ -83,49 +88,79 @@ TEST_F(Frame, LoadsAsTheHostLoadsIt)
     EXPECT_NE(plugin(), nullptr) << "the instance is an IPluginObjectBase";
 }
 
-struct Initialisation
+struct EntryPoint
 {
     const char *name;
-    int tools; // 0: none, 1: without a tunnel, 2: with one
-    bool result;
+    Call call;
     QStringList records;
-    QStringList sentByAQuery;
+    QStringList sentByAQueryAfter;
 };
 
-void PrintTo(const Initialisation &row, std::ostream *os)
+void PrintTo(const EntryPoint &row, std::ostream *os)
 {
     *os << row.name;
 }
 
-class Initialises : public Frame, public ::testing::WithParamInterface<Initialisation>
+class EntryPoints : public Frame, public ::testing::WithParamInterface<EntryPoint>
 {};
 
-TEST_P(Initialises, ReportsAndKeepsTheTunnel)
+// Initialisation succeeds exactly when there is a tunnel, which then takes
+// the requests; the blocking operations do nothing but trace.
+TEST_P(EntryPoints, TraceAndLeaveTheTunnelInUse)
 {
-    IFrameworkTools *const given[] = {nullptr, &noTunnel, &tools};
-    EXPECT_EQ(plugin()->InitialPluginBase(given[GetParam().tools]), GetParam().result);
+    CountingResponser responser;
+    IPluginObjectBase *const p = plugin();
+    const Call call = GetParam().call;
+    if (call >= NoTools && call <= Tunnel) {
+        EXPECT_EQ(initialise(call), call == Tunnel);
+    }
+    if (call == Request)
+        p->Request(u"Unknown"_s, QVariant(), RequestSenderInfo{}, reply.callback());
+    if (call == Block)
+        p->RequestBlock(u"GetScheduleRecInfo"_s, QVariant(), RequestSenderInfo{}, responser);
+    if (call == Subscribe)
+        p->SubscribeEventBlock(u"e"_s, u"f"_s, QVariant(), RequestSenderInfo{}, responser);
+    if (call == Unsubscribe)
+        p->UnsubscribeEventBlock(u"e"_s, QVariant(), responser);
+    if (call == Delete)
+        delete p;
     EXPECT_EQ(records(), GetParam().records);
+    EXPECT_EQ(responser.calls, 0);
     plugin()->Request(u"GetScheduleRecInfo"_s, QVariant(), RequestSenderInfo{}, reply.callback());
-    EXPECT_EQ(tunnel.commands(), GetParam().sentByAQuery);
+    EXPECT_EQ(tunnel.commands(), GetParam().sentByAQueryAfter);
 }
 
-const QString Enter = u"5 PluginRecordingScheduleSettingSrv::InitialPluginBase, Enter"_s;
-const QString Leave = u"5 PluginRecordingScheduleSettingSrv::InitialPluginBase, Leave"_s;
-const QString NoTunnel =
-    u"2 PluginRecordingScheduleSettingSrv::InitialPluginBase, Tunnel client get null."_s;
+QStringList traced(const char *function)
+{
+    const QString name = u"5 PluginRecordingScheduleSettingSrv::"_s + QLatin1String(function);
+    return {name + u", Enter"_s, name + u", Leave"_s};
+}
+
+const QStringList NoTunnelRecords{
+    u"5 PluginRecordingScheduleSettingSrv::InitialPluginBase, Enter"_s,
+    u"2 PluginRecordingScheduleSettingSrv::InitialPluginBase, Tunnel client get null."_s,
+    u"5 PluginRecordingScheduleSettingSrv::InitialPluginBase, Leave"_s};
 
 INSTANTIATE_TEST_SUITE_P(
-    Frame, Initialises,
+    Frame, EntryPoints,
     ::testing::Values(
-        Initialisation{"no_tools_fail", 0, false, {Enter, NoTunnel, Leave}, {}},
-        Initialisation{"tools_without_tunnel_fail", 1, false, {Enter, NoTunnel, Leave}, {}},
-        Initialisation{"a_tunnel_takes_the_requests", 2, true, {Enter, Leave}, {"GetRecTmcard"}}),
+        EntryPoint{"initialisation_without_tools_fails", NoTools, NoTunnelRecords, {}},
+        EntryPoint{"initialisation_without_a_tunnel_fails", NoTunnel, NoTunnelRecords, {}},
+        EntryPoint{"initialisation_with_a_tunnel",
+                   Tunnel,
+                   traced("InitialPluginBase"),
+                   {u"GetRecTmcard"_s}},
+        EntryPoint{"request", Request, traced("Request"), {}},
+        EntryPoint{"request_block", Block, traced("RequestBlock"), {}},
+        EntryPoint{"subscribe_event_block", Subscribe, traced("SubscribeEventBlock"), {}},
+        EntryPoint{"unsubscribe_event_block", Unsubscribe, traced("UnsubscribeEventBlock"), {}},
+        EntryPoint{"deletion", Delete, traced("~PluginRecordingScheduleSettingSrv"), {}}),
     [](const auto &info) { return std::string(info.param.name); });
 
 struct AtOnce
 {
     const char *name;
-    int tools; // initialised with: -1 nothing, 1 tools without a tunnel, 2 with one
+    Call initialisation;
     QString command;
 };
 
@@ -139,8 +174,8 @@ class AnsweredAtOnce : public Frame, public ::testing::WithParamInterface<AtOnce
 
 TEST_P(AnsweredAtOnce, WithTrueMinusOneAndNothingSent)
 {
-    if (GetParam().tools > 0)
-        plugin()->InitialPluginBase(GetParam().tools == 2 ? &tools : &noTunnel);
+    if (GetParam().initialisation != Nothing)
+        initialise(GetParam().initialisation);
     plugin()->Request(GetParam().command, QVariantMap{{u"TimeCardID"_s, u"5"_s}},
                       RequestSenderInfo{}, reply.callback());
     ASSERT_EQ(reply.count(), 1);
@@ -154,48 +189,15 @@ TEST_P(AnsweredAtOnce, WithTrueMinusOneAndNothingSent)
 // Without a control, requests once went nowhere: they are answered at once.
 INSTANTIATE_TEST_SUITE_P(
     Frame, AnsweredAtOnce,
-    ::testing::Values(AtOnce{"another_letter_case_is_unknown", 2, u"delschedule"_s},
-                      AtOnce{"a_trailing_space_is_unknown", 2, u"DelSchedule "_s},
-                      AtOnce{"continuous_spelt_right_is_unknown", 2,
+    ::testing::Values(AtOnce{"another_letter_case_is_unknown", Tunnel, u"delschedule"_s},
+                      AtOnce{"a_trailing_space_is_unknown", Tunnel, u"DelSchedule "_s},
+                      AtOnce{"continuous_spelt_right_is_unknown", Tunnel,
                              u"DefaultContinuousSchedule"_s},
-                      AtOnce{"a_tunnel_command_is_no_client_command", 2, u"GetRecTmcard"_s},
-                      AtOnce{"an_empty_command_is_unknown", 2, QString()},
-                      AtOnce{"a_query_before_initialisation", -1, u"GetScheduleRecInfo"_s},
-                      AtOnce{"a_deletion_before_initialisation", -1, u"DelSchedule"_s},
-                      AtOnce{"a_change_after_failed_initialisation", 1, u"AddSchedule"_s}),
+                      AtOnce{"a_tunnel_command_is_no_client_command", Tunnel, u"GetRecTmcard"_s},
+                      AtOnce{"an_empty_command_is_unknown", Tunnel, QString()},
+                      AtOnce{"a_query_before_initialisation", Nothing, u"GetScheduleRecInfo"_s},
+                      AtOnce{"a_deletion_before_initialisation", Nothing, u"DelSchedule"_s},
+                      AtOnce{"a_change_after_failed_initialisation", NoTunnel, u"AddSchedule"_s}),
     [](const auto &info) { return std::string(info.param.name); });
-
-class EntryPoints : public Frame, public ::testing::WithParamInterface<QString>
-{};
-
-// The blocking operations do nothing else: no reply, no call on the responser.
-TEST_P(EntryPoints, WriteEnterThenLeave)
-{
-    CountingResponser responser;
-    IPluginObjectBase *const p = plugin();
-    const QString &function = GetParam();
-    if (function == u"InitialPluginBase")
-        p->InitialPluginBase(&tools);
-    else if (function == u"Request")
-        p->Request(u"Unknown"_s, QVariant(), RequestSenderInfo{}, reply.callback());
-    else if (function == u"RequestBlock")
-        p->RequestBlock(u"GetScheduleRecInfo"_s, QVariant(), RequestSenderInfo{}, responser);
-    else if (function == u"SubscribeEventBlock")
-        p->SubscribeEventBlock(u"e"_s, u"f"_s, QVariant(), RequestSenderInfo{}, responser);
-    else if (function == u"UnsubscribeEventBlock")
-        p->UnsubscribeEventBlock(u"e"_s, QVariant(), responser);
-    else
-        delete p;
-    const QString name = u"PluginRecordingScheduleSettingSrv::"_s + function;
-    EXPECT_EQ(records(),
-              (QStringList{u"5 "_s + name + u", Enter"_s, u"5 "_s + name + u", Leave"_s}));
-    EXPECT_EQ(responser.calls, 0);
-}
-
-INSTANTIATE_TEST_SUITE_P(Frame, EntryPoints,
-                         ::testing::Values(u"InitialPluginBase"_s, u"Request"_s, u"RequestBlock"_s,
-                                           u"SubscribeEventBlock"_s, u"UnsubscribeEventBlock"_s,
-                                           u"~PluginRecordingScheduleSettingSrv"_s),
-                         [](const auto &info) { return info.param.mid(1).toStdString(); });
 
 } // namespace

@@ -2,15 +2,9 @@
 
 #include <algorithm>
 
-TestTunnel::TestTunnel(Delivery delivery) : m_delivery(delivery), m_worker([this] { workerLoop(); })
-{}
-
 TestTunnel::~TestTunnel()
 {
-    {
-        const std::lock_guard<std::mutex> lock(m_mutex);
-        m_stopping = true;
-    }
+    locked([&] { m_stopping = true; });
     m_wake.notify_all();
     m_worker.join();
     for (const Held &held : std::deque<Held>(std::move(m_held)))
@@ -19,39 +13,8 @@ TestTunnel::~TestTunnel()
 
 void TestTunnel::setDelivery(Delivery delivery)
 {
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    m_delivery = delivery;
+    locked([&] { m_delivery = delivery; });
     m_wake.notify_all();
-}
-
-void TestTunnel::setResponder(Responder responder)
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    m_responder = std::move(responder);
-}
-
-void TestTunnel::queueAnswer(const Answer &answer)
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    m_answers.push_back(answer);
-}
-
-void TestTunnel::refuseNext(int n)
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    m_refuseNext = n;
-}
-
-void TestTunnel::setRefusal(std::function<bool(const Sent &)> refuse)
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    m_refusal = std::move(refuse);
-}
-
-QList<TestTunnel::Sent> TestTunnel::sent() const
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    return m_sent;
 }
 
 QStringList TestTunnel::commands() const
@@ -62,38 +25,31 @@ QStringList TestTunnel::commands() const
     return result;
 }
 
-int TestTunnel::pending() const
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    return static_cast<int>(m_held.size());
-}
-
 bool TestTunnel::SendRequest(const QString &pluginId, void *clientId, int kind,
                              const QString &command, TunnelRequest &request)
 {
     const Sent sent{pluginId,     clientId,          kind,         command,
                     request.body, request.timeoutMs, request.flag, request.extra};
     Held held{request.onResponse, Answer{}};
-    {
-        const std::lock_guard<std::mutex> lock(m_mutex);
-        if (m_refuseNext > 0 || (m_refusal && m_refusal(sent))) {
-            m_refuseNext = std::max(0, m_refuseNext - 1);
-            return false;
-        }
-        m_sent.append(sent);
-        if (m_responder) {
-            held.second = m_responder(sent);
-        } else if (!m_answers.empty()) {
-            held.second = m_answers.front();
-            m_answers.pop_front();
-        }
-        if (m_delivery != Delivery::Immediately) {
-            m_held.push_back(std::move(held));
-            m_wake.notify_all();
-            return true;
-        }
+    std::unique_lock<std::mutex> lock(m_mutex);
+    if (m_refuseNext > 0 || (m_refusal && m_refusal(sent))) {
+        m_refuseNext = std::max(0, m_refuseNext - 1);
+        return false;
     }
-    deliver(held);
+    m_sent.append(sent);
+    if (m_responder) {
+        held.second = m_responder(sent);
+    } else if (!m_answers.empty()) {
+        held.second = m_answers.front();
+        m_answers.pop_front();
+    }
+    if (m_delivery == Delivery::Immediately) {
+        lock.unlock();
+        deliver(held);
+    } else {
+        m_held.push_back(std::move(held));
+        m_wake.notify_all();
+    }
     return true;
 }
 
@@ -114,12 +70,6 @@ bool TestTunnel::deliverNext()
     lock.unlock();
     deliver(held);
     return true;
-}
-
-void TestTunnel::deliverAll()
-{
-    while (deliverNext()) {
-    }
 }
 
 void TestTunnel::waitIdle()

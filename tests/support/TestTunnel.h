@@ -37,27 +37,49 @@ public:
         bool flag = false;
     };
     enum class Delivery { Immediately, Held, OtherThread };
-    // Answers one send (called under the tunnel's lock). Without one, answers
-    // come from the queue; an empty queue answers ok, code "0", no content.
+    // Answers one send, under the tunnel's lock. Without one, answers come
+    // from the queue; an empty queue answers ok, code "0", no content.
     using Responder = std::function<Answer(const Sent &)>;
 
-    explicit TestTunnel(Delivery delivery = Delivery::Immediately);
+    explicit TestTunnel(Delivery delivery = Delivery::Immediately) : m_delivery(delivery) {}
     ~TestTunnel() override;
 
     void setDelivery(Delivery delivery);
-    void setResponder(Responder responder);
-    void queueAnswer(const Answer &answer);
-    // The next n sends are refused, as are those the predicate picks.
-    void refuseNext(int n = 1);
-    void setRefusal(std::function<bool(const Sent &)> refuse);
+    void setResponder(Responder responder)
+    {
+        locked([&] { m_responder = std::move(responder); });
+    }
+    void queueAnswer(const Answer &answer)
+    {
+        locked([&] { m_answers.push_back(answer); });
+    }
+    // The next n sends are refused, and so is every send the predicate picks.
+    void refuseNext(int n = 1)
+    {
+        locked([&] { m_refuseNext = n; });
+    }
+    void setRefusal(std::function<bool(const Sent &)> refuse)
+    {
+        locked([&] { m_refusal = std::move(refuse); });
+    }
 
-    QList<Sent> sent() const;
+    QList<Sent> sent() const
+    {
+        return locked([&] { return m_sent; });
+    }
     QStringList commands() const;
-    int pending() const;
-    // Held: answers the oldest send the tunnel holds, or all of them, on the
-    // caller's thread; false when it holds none.
+    int pending() const
+    {
+        return locked([&] { return int(m_held.size()); });
+    }
+    // Held: answers the oldest send held, on the caller's thread; false when
+    // none is held.
     bool deliverNext();
-    void deliverAll();
+    void deliverAll()
+    {
+        while (deliverNext()) {
+        }
+    }
     // OtherThread: waits until everything taken has been answered.
     void waitIdle();
 
@@ -70,6 +92,11 @@ public:
 
 private:
     using Held = std::pair<TunnelResponseHandler, Answer>;
+    template <typename F> auto locked(F f) const -> decltype(f())
+    {
+        const std::scoped_lock lock(m_mutex);
+        return f();
+    }
     static void deliver(const Held &held);
     void workerLoop();
 
@@ -85,5 +112,5 @@ private:
     std::deque<Held> m_held;
     bool m_busy = false;
     bool m_stopping = false;
-    std::thread m_worker;
+    std::thread m_worker{[this] { workerLoop(); }};
 };
