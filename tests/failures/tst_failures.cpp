@@ -238,6 +238,13 @@ enum class Meanwhile {
     DeletePlugins,
 };
 
+const char *const RunNames[] = {"alone", "controls_replaced", "plugins_deleted"};
+
+void PrintTo(Meanwhile meanwhile, std::ostream *os)
+{
+    *os << RunNames[int(meanwhile)];
+}
+
 class Concurrent : public ::testing::TestWithParam<Meanwhile>
 {};
 
@@ -286,8 +293,6 @@ TEST_P(Concurrent, EveryRequestGetsExactlyOneReply)
         }
     }
 }
-
-const char *const RunNames[] = {"alone", "controls_replaced", "plugins_deleted"};
 
 INSTANTIATE_TEST_SUITE_P(Chains, Concurrent,
                          ::testing::Values(Meanwhile::Nothing, Meanwhile::ReplaceControls,

@@ -47,6 +47,11 @@ struct Row
     QByteArray written; // in hex
 };
 
+void PrintTo(const Row &row, std::ostream *os)
+{
+    *os << row.name;
+}
+
 class DataObject : public ::testing::TestWithParam<Row>
 {};
 
