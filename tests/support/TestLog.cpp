@@ -83,10 +83,3 @@ int TestLog::filterCalls() const
     const std::lock_guard<std::mutex> lock(m_mutex);
     return m_filterCalls;
 }
-
-void TestLog::clear()
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    m_records.clear();
-    m_filterCalls = 0;
-}

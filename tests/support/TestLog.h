@@ -37,7 +37,6 @@ public:
     // Texts of the records at one level, or of all when level is 0.
     QStringList texts(int level = 0) const;
     int filterCalls() const;
-    void clear();
 
     LogTraceObject object{};
 
