@@ -10,8 +10,7 @@
 #include <mutex>
 #include <vector>
 
-// Keeps every reply given through the callbacks it hands out; replies may
-// arrive on any thread.
+// Keeps every reply given through the callbacks it hands out, from any thread.
 class ReplyRecorder
 {
 public:
@@ -26,35 +25,27 @@ public:
     ResponseCallback callback()
     {
         return [this](bool flag, const QString &code, const QString &text, const QVariant &data) {
-            {
-                const std::lock_guard<std::mutex> lock(m_mutex);
-                m_replies.push_back({flag, code, text, data});
-            }
+            const std::lock_guard<std::mutex> lock(m_mutex);
+            m_replies.push_back({flag, code, text, data});
             m_changed.notify_all();
         };
     }
-
     std::vector<Reply> replies() const
     {
         const std::lock_guard<std::mutex> lock(m_mutex);
         return m_replies;
     }
-    int count() const
-    {
-        const std::lock_guard<std::mutex> lock(m_mutex);
-        return static_cast<int>(m_replies.size());
-    }
+    int count() const { return static_cast<int>(replies().size()); }
     Reply last() const
     {
-        const std::lock_guard<std::mutex> lock(m_mutex);
-        return m_replies.empty() ? Reply{} : m_replies.back();
+        const std::vector<Reply> all = replies();
+        return all.empty() ? Reply{} : all.back();
     }
     // Waits until n replies have arrived; false on time-out.
     bool waitFor(int n, std::chrono::milliseconds timeout = std::chrono::seconds(10)) const
     {
         std::unique_lock<std::mutex> lock(m_mutex);
-        return m_changed.wait_for(lock, timeout,
-                                  [&] { return m_replies.size() >= static_cast<size_t>(n); });
+        return m_changed.wait_for(lock, timeout, [&] { return m_replies.size() >= size_t(n); });
     }
 
 private:

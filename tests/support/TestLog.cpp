@@ -6,7 +6,7 @@
 #include <cstdio>
 
 namespace {
-// Like the real library, a record's selector and origin travel from the
+// As in the real library, a record's selector and origin travel from the
 // filter call to the write call that follows it on the same thread.
 thread_local TestLog::Record t_pending{};
 } // namespace
@@ -14,8 +14,22 @@ thread_local TestLog::Record t_pending{};
 TestLog::TestLog(std::int32_t moduleId, bool withRegister) : m_moduleId(moduleId)
 {
     object.context = this;
-    object.registerModule = withRegister ? &TestLog::registerModule : nullptr;
-    object.filter = &TestLog::filter;
+    if (withRegister) {
+        object.registerModule = [](void *context, std::int32_t, const char *, std::int32_t *id) {
+            if (context && id)
+                *id = static_cast<TestLog *>(context)->m_moduleId;
+        };
+    }
+    object.filter = [](void *context, std::uint32_t selector, std::int32_t, const char *file,
+                       std::int32_t line) -> std::int32_t {
+        auto *self = static_cast<TestLog *>(context);
+        const std::lock_guard<std::mutex> lock(self->m_mutex);
+        ++self->m_filterCalls;
+        if (self->m_filter && self->m_filter(selector) != 0)
+            return 1;
+        t_pending = Record{selector, QString::fromUtf8(file), line, QString()};
+        return 0;
+    };
     object.write = &TestLog::write;
 }
 
@@ -41,66 +55,31 @@ QList<TestLog::Record> TestLog::records() const
     return m_records;
 }
 
-QStringList TestLog::texts() const
-{
-    QStringList result;
-    for (const Record &r : records())
-        result << r.text;
-    return result;
-}
-
 QStringList TestLog::texts(int level) const
 {
     QStringList result;
     for (const Record &r : records()) {
-        if (r.level() == level)
+        if (level == 0 || r.level() == level)
             result << r.text;
     }
     return result;
+}
+
+void TestLog::write(void *context, const char *format, ...)
+{
+    char buffer[4096];
+    va_list args;
+    va_start(args, format);
+    std::vsnprintf(buffer, sizeof buffer, format, args);
+    va_end(args);
+    auto *self = static_cast<TestLog *>(context);
+    const std::lock_guard<std::mutex> lock(self->m_mutex);
+    self->m_records.append(t_pending);
+    self->m_records.back().text = QString::fromLocal8Bit(buffer);
 }
 
 int TestLog::filterCalls() const
 {
     const std::lock_guard<std::mutex> lock(m_mutex);
     return m_filterCalls;
-}
-
-void TestLog::clear()
-{
-    const std::lock_guard<std::mutex> lock(m_mutex);
-    m_records.clear();
-    m_filterCalls = 0;
-}
-
-void TestLog::registerModule(void *context, std::int32_t, const char *, std::int32_t *moduleId)
-{
-    // Like the real library, an object without a context hands out nothing.
-    if (context && moduleId)
-        *moduleId = static_cast<TestLog *>(context)->m_moduleId;
-}
-
-std::int32_t TestLog::filter(void *context, std::uint32_t selector, std::int32_t,
-                             const char *file, std::int32_t line)
-{
-    auto *self = static_cast<TestLog *>(context);
-    const std::lock_guard<std::mutex> lock(self->m_mutex);
-    ++self->m_filterCalls;
-    if (self->m_filter && self->m_filter(selector) != 0)
-        return 1;
-    t_pending = Record{selector, QString::fromUtf8(file), line, QString()};
-    return 0;
-}
-
-void TestLog::write(void *context, const char *format, ...)
-{
-    auto *self = static_cast<TestLog *>(context);
-    char buffer[4096];
-    va_list args;
-    va_start(args, format);
-    std::vsnprintf(buffer, sizeof buffer, format, args);
-    va_end(args);
-    const std::lock_guard<std::mutex> lock(self->m_mutex);
-    Record record = t_pending;
-    record.text = QString::fromLocal8Bit(buffer);
-    self->m_records.append(record);
 }

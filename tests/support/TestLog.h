@@ -3,15 +3,14 @@
 #include "LogTraceObject.h"
 
 #include <QList>
-#include <QString>
+#include <QStringList>
 
 #include <cstdint>
 #include <functional>
 #include <mutex>
 
-// A log object for tests: keeps every record the plug-in writes through the
-// trace facility. attach() makes it the plug-in's log object; the destructor
-// turns logging off again.
+// A log object that keeps every record the plug-in's trace facility writes
+// while it is attached; the destructor turns logging off again.
 class TestLog
 {
 public:
@@ -35,19 +34,13 @@ public:
     void setFilter(std::function<std::int32_t(std::uint32_t selector)> filter);
 
     QList<Record> records() const;
-    QStringList texts() const;
-    // Texts of records at one level.
-    QStringList texts(int level) const;
+    // Texts of the records at one level, or of all when level is 0.
+    QStringList texts(int level = 0) const;
     int filterCalls() const;
-    void clear();
 
     LogTraceObject object{};
 
 private:
-    static void registerModule(void *context, std::int32_t kind, const char *name,
-                               std::int32_t *moduleId);
-    static std::int32_t filter(void *context, std::uint32_t selector, std::int32_t reserved,
-                               const char *file, std::int32_t line);
     static void write(void *context, const char *format, ...);
 
     mutable std::mutex m_mutex;

@@ -3,7 +3,7 @@
 #include "IKoltTunnelClient.h"
 
 #include <QList>
-#include <QString>
+#include <QStringList>
 
 #include <condition_variable>
 #include <deque>
@@ -11,9 +11,10 @@
 #include <mutex>
 #include <thread>
 
-// A tunnel for unit tests: records every send and answers with scripted
-// values, at once (inside SendRequest), when the test says so, or from a
-// thread of its own. Thread-safe; handlers are always called outside its lock.
+// A scripted tunnel: records every send and answers with scripted values, at
+// once (inside SendRequest), when the test says so, or in order from a thread
+// of its own. Handlers are called outside its lock; whatever it still holds
+// when it goes is answered ok false, so every taken send gets one answer.
 class TestTunnel final : public IKoltTunnelClient
 {
 public:
@@ -28,7 +29,6 @@ public:
         bool requestFlag = false;
         QString extra;
     };
-
     struct Answer
     {
         bool ok = true;
@@ -36,39 +36,54 @@ public:
         QString content;
         bool flag = false;
     };
-
-    enum class Delivery {
-        Immediately, // inside SendRequest, on the sender's thread
-        Held,        // when the test calls deliverNext() or deliverAll()
-        OtherThread, // in order, on the tunnel's own thread
-    };
-
-    // Computes the answer to one send; by default answers come from the
-    // queue of scripted answers, and an empty queue answers ok with code "0"
-    // and no content.
+    enum class Delivery { Immediately, Held, OtherThread };
+    // Answers one send, under the tunnel's lock. Without one, answers come
+    // from the queue; an empty queue answers ok, code "0", no content.
     using Responder = std::function<Answer(const Sent &)>;
 
-    explicit TestTunnel(Delivery delivery = Delivery::Immediately);
+    explicit TestTunnel(Delivery delivery = Delivery::Immediately) : m_delivery(delivery) {}
     ~TestTunnel() override;
 
     void setDelivery(Delivery delivery);
-    void setResponder(Responder responder);
-    void queueAnswer(const Answer &answer);
-    // The next n sends are refused (SendRequest returns false).
-    void refuseNext(int n = 1);
-    // Refuses every send for which the predicate holds.
-    void setRefusal(std::function<bool(const Sent &)> refuse);
+    void setResponder(Responder responder)
+    {
+        locked([&] { m_responder = std::move(responder); });
+    }
+    void queueAnswer(const Answer &answer)
+    {
+        locked([&] { m_answers.push_back(answer); });
+    }
+    // The next n sends are refused, and so is every send the predicate picks.
+    void refuseNext(int n = 1)
+    {
+        locked([&] { m_refuseNext = n; });
+    }
+    void setRefusal(std::function<bool(const Sent &)> refuse)
+    {
+        locked([&] { m_refusal = std::move(refuse); });
+    }
 
-    QList<Sent> sent() const;
+    QList<Sent> sent() const
+    {
+        return locked([&] { return m_sent; });
+    }
     QStringList commands() const;
-    int pending() const;
+    int pending() const
+    {
+        return locked([&] { return int(m_held.size()); });
+    }
+    // Held: answers the oldest send held, on the caller's thread; false when
+    // none is held.
     bool deliverNext();
-    void deliverAll();
-    // Waits until the tunnel's thread has delivered everything it took.
+    void deliverAll()
+    {
+        while (deliverNext()) {
+        }
+    }
+    // OtherThread: waits until everything taken has been answered.
     void waitIdle();
 
     void *ownId() const { return const_cast<TestTunnel *>(this); }
-
     bool IsConnected() const override { return true; }
     void *GetClientID() override { return ownId(); }
     QString GetServerAddress() const override { return QStringLiteral("test"); }
@@ -76,14 +91,13 @@ public:
                      TunnelRequest &request) override;
 
 private:
-    struct Pending
+    using Held = std::pair<TunnelResponseHandler, Answer>;
+    template <typename F> auto locked(F f) const -> decltype(f())
     {
-        Sent sent;
-        TunnelResponseHandler handler;
-    };
-
-    Answer answerFor(const Sent &sent);
-    static void deliver(Pending &pending, const Answer &answer);
+        const std::scoped_lock lock(m_mutex);
+        return f();
+    }
+    static void deliver(const Held &held);
     void workerLoop();
 
     mutable std::mutex m_mutex;
@@ -95,8 +109,8 @@ private:
     int m_refuseNext = 0;
     std::function<bool(const Sent &)> m_refusal;
     QList<Sent> m_sent;
-    std::deque<std::pair<Pending, Answer>> m_pending;
+    std::deque<Held> m_held;
     bool m_busy = false;
     bool m_stopping = false;
-    std::thread m_worker;
+    std::thread m_worker{[this] { workerLoop(); }};
 };
