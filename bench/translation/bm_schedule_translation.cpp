@@ -5,7 +5,7 @@
 // linear walk, so that the ratio between the two shows whether the
 // translation keeps pace as the input grows.
 
-#include "FakeControl.h"
+#include "AnsweringControl.h"
 #include "PluginRecordingScheduleSettingSrv.h"
 #include "RequestSenderInfo.h"
 
@@ -92,10 +92,8 @@ QList<QVariant> timecards(int count)
 
 void runAllScheduleRecInfo(benchmark::State &state, const QList<QVariant> &input)
 {
-    const auto control = QSharedPointer<FakeControl>::create();
-    control->setAnswer({true, false, input, QString()});
     PluginRecordingScheduleSettingSrv plugin;
-    plugin.SetRecordingSettingControl(control);
+    plugin.SetRecordingSettingControl(QSharedPointer<AnsweringControl>::create(input));
     qsizetype written = 0;
     for (auto _ : state) {
         plugin.Request(QStringLiteral("GetAllScheduleRecInfo"), QVariant(), RequestSenderInfo{},
