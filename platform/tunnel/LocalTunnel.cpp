@@ -84,8 +84,11 @@ TunnelBackendFactory recordingServerBackend(const QString &databasePath, AnswerL
 {
     return [databasePath, layout, server](QString *error) -> TunnelBackend {
         auto owned = std::make_shared<RecordingServer>(databasePath, layout);
-        if (!owned->open(error))
+        if (const Refusal refusal = owned->open(); refusal.refused()) {
+            if (error)
+                *error = refusal.reason;
             return {};
+        }
         if (server)
             *server = owned.get();
         return [owned](const QString &command, const QString &body) {

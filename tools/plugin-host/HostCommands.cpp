@@ -54,18 +54,17 @@ int runRequests(const HostOptions &options, const std::vector<HostRequest> &requ
 bool openServer(const HostOptions &options, RecordingServer **server,
                 std::unique_ptr<RecordingServer> *holder)
 {
-    AnswerLayout layout = AnswerLayout::Compact;
-    if (!parseAnswerLayout(options.answerLayout, &layout)) {
+    const std::optional<AnswerLayout> layout = parseAnswerLayout(options.answerLayout);
+    if (!layout) {
         printError(QStringLiteral("--answer-layout takes compact, indented or crlf, not \"%1\"")
                        .arg(options.answerLayout));
         return false;
     }
     const QString database =
         options.databaseFile.isEmpty() ? defaultDatabasePath() : options.databaseFile;
-    *holder = std::make_unique<RecordingServer>(database, layout);
-    QString error;
-    if (!(*holder)->open(&error)) {
-        printError(QStringLiteral("the server's database does not open: %1").arg(error));
+    *holder = std::make_unique<RecordingServer>(database, *layout);
+    if (const Refusal refusal = (*holder)->open(); refusal.refused()) {
+        printError(QStringLiteral("the server's database does not open: %1").arg(refusal.reason));
         return false;
     }
     *server = holder->get();
@@ -191,8 +190,8 @@ int runSeed(const HostOptions &options)
     std::unique_ptr<RecordingServer> holder;
     if (!openServer(options, &server, &holder))
         return ExitUsage;
-    if (!server->seed(QString::fromUtf8(*xml), &error)) {
-        printError(QStringLiteral("%1: %2").arg(options.arguments.first(), error));
+    if (const Refusal refusal = server->seed(QString::fromUtf8(*xml)); refusal.refused()) {
+        printError(QStringLiteral("%1: %2").arg(options.arguments.first(), refusal.text()));
         return ExitUsage;
     }
     return ExitOk;

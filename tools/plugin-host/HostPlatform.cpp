@@ -34,8 +34,8 @@ bool HostPlatform::loadPlugin(QString *error)
 
 bool HostPlatform::startTunnel(QString *error)
 {
-    AnswerLayout layout = AnswerLayout::Compact;
-    if (!parseAnswerLayout(m_options.answerLayout, &layout)) {
+    const std::optional<AnswerLayout> layout = parseAnswerLayout(m_options.answerLayout);
+    if (!layout) {
         *error = QStringLiteral("--answer-layout takes compact, indented or crlf, not \"%1\"")
                      .arg(m_options.answerLayout);
         return false;
@@ -53,7 +53,7 @@ bool HostPlatform::startTunnel(QString *error)
     tunnelOptions.faultSeed = m_options.faultSeed;
     tunnelOptions.exchangeLogPath = m_options.exchangesFile;
     m_tunnel =
-        std::make_unique<LocalTunnel>(recordingServerBackend(database, layout), tunnelOptions);
+        std::make_unique<LocalTunnel>(recordingServerBackend(database, *layout), tunnelOptions);
     if (!m_tunnel->IsConnected()) {
         *error = QStringLiteral("the server does not start: %1").arg(m_tunnel->errorString());
         return false;
