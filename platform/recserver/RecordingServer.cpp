@@ -18,56 +18,60 @@ QString uniqueConnectionName()
 
 const Refusal kNotOpen{ServerCode::StorageFailure, QStringLiteral("database not open")};
 
-ServerAnswer okAnswer(QString content)
+// The answer to a request: the first refusal on the way, or the text that
+// write makes of the request and of what the store returned for it.
+template <typename Request, typename CarryOut, typename Write>
+ServerAnswer answer(const Result<Request> &request, AnswerLayout layout, CarryOut carryOut,
+                    Write write)
 {
-    return {serverCodeText(ServerCode::Ok), std::move(content)};
+    if (request.refused())
+        return refusalAnswer(request.refusal(), layout);
+    const auto outcome = carryOut(*request);
+    if (outcome.refused())
+        return refusalAnswer(outcome.refusal(), layout);
+    return {serverCodeText(ServerCode::Ok), write(*request, *outcome)};
 }
 
 ServerAnswer answerRead(TimecardStore &store, const QString &body, AnswerLayout layout)
 {
-    const Result<ReadRequest> request = parseReadRequest(body);
-    if (request.refused())
-        return refusalAnswer(request.refusal(), layout);
-    // An identifier that is not held is an empty answer, not a refusal.
-    const Result<std::vector<Timecard>> cards =
-        store.read(request->all ? std::nullopt : std::optional<qint64>(request->id));
-    if (cards.refused())
-        return refusalAnswer(cards.refusal(), layout);
-    return okAnswer(timecardsAnswer(*cards, layout));
+    return answer(
+        parseReadRequest(body), layout,
+        // An identifier that is not held is an empty answer, not a refusal.
+        [&](const ReadRequest &request) {
+            return store.read(request.all ? std::nullopt : std::optional<qint64>(request.id));
+        },
+        [&](const ReadRequest &, const std::vector<Timecard> &cards) {
+            return timecardsAnswer(cards, layout);
+        });
 }
 
 ServerAnswer answerInsert(TimecardStore &store, const QString &body, AnswerLayout layout)
 {
-    const Result<Timecard> card = parseInsertRequest(body);
-    if (card.refused())
-        return refusalAnswer(card.refusal(), layout);
-    const Result<qint64> id = store.insert(*card);
-    if (id.refused())
-        return refusalAnswer(id.refusal(), layout);
-    return okAnswer(fieldsAnswer(u"InsRecTmcardRes", {{u"TmcardID", *id}}, layout));
+    return answer(
+        parseInsertRequest(body), layout, [&](const Timecard &card) { return store.insert(card); },
+        [&](const Timecard &, qint64 id) {
+            return fieldsAnswer(u"InsRecTmcardRes", {{u"TmcardID", id}}, layout);
+        });
 }
 
 ServerAnswer answerUpdate(TimecardStore &store, const QString &body, AnswerLayout layout)
 {
-    const Result<Timecard> card = parseUpdateRequest(body);
-    if (card.refused())
-        return refusalAnswer(card.refusal(), layout);
-    const Result<qint64> revision = store.update(*card);
-    if (revision.refused())
-        return refusalAnswer(revision.refusal(), layout);
-    return okAnswer(fieldsAnswer(u"UpdRecTmcardRes",
-                                 {{u"TmcardID", card->id}, {u"Revision", *revision}}, layout));
+    return answer(
+        parseUpdateRequest(body), layout, [&](const Timecard &card) { return store.update(card); },
+        [&](const Timecard &card, qint64 revision) {
+            return fieldsAnswer(u"UpdRecTmcardRes",
+                                {{u"TmcardID", card.id}, {u"Revision", revision}}, layout);
+        });
 }
 
 ServerAnswer answerDelete(TimecardStore &store, const QString &body, AnswerLayout layout)
 {
-    const Result<DeleteRequest> request = parseDeleteRequest(body);
-    if (request.refused())
-        return refusalAnswer(request.refusal(), layout);
-    const Refusal refusal = store.remove(request->id, request->revision);
-    if (refusal.refused())
-        return refusalAnswer(refusal, layout);
-    return okAnswer(fieldsAnswer(u"DelTmcardRes", {{u"TmcardID", request->id}}, layout));
+    return answer(
+        parseDeleteRequest(body), layout,
+        [&](const DeleteRequest &request) { return store.remove(request.id, request.revision); },
+        [&](const DeleteRequest &request, qint64) {
+            return fieldsAnswer(u"DelTmcardRes", {{u"TmcardID", request.id}}, layout);
+        });
 }
 
 using CommandHandler = ServerAnswer (*)(TimecardStore &, const QString &body, AnswerLayout);

@@ -5,6 +5,8 @@
 #include <QLatin1String>
 
 #include <algorithm>
+#include <functional>
+#include <initializer_list>
 #include <optional>
 #include <unordered_set>
 
@@ -82,6 +84,27 @@ template <typename T> bool take(std::optional<T> value, T &field)
     return true;
 }
 
+using FieldReader = std::function<bool(XmlCursor &)>;
+
+// Reads the children of the element the cursor stands on, each of one of the
+// given kinds and at most once, through its reader; false at the first
+// refusal. The kinds seen are in seen.
+bool readFields(XmlCursor &cursor, QLatin1String parent,
+                std::initializer_list<std::pair<QLatin1String, FieldReader>> fields, Seen &seen)
+{
+    while (cursor.nextChild()) {
+        const auto field = std::find_if(fields.begin(), fields.end(),
+                                        [&](const auto &f) { return cursor.name() == f.first; });
+        if (field == fields.end()) {
+            unexpected(cursor, parent);
+            return false;
+        }
+        if (!seen.first(cursor, field->first) || !field->second(cursor))
+            return false;
+    }
+    return !cursor.refused();
+}
+
 // The request the body makes, or the first reason to refuse the body.
 template <typename T> Result<T> resultOf(XmlCursor &cursor, std::optional<T> value)
 {
@@ -138,34 +161,20 @@ std::optional<std::vector<Camera>> readCameraList(XmlCursor &cursor)
 
 enum class IdFields { Required, Optional };
 
-// Reads one child of a <Tmcard> element into the time card.
-bool readTimecardField(XmlCursor &cursor, Seen &seen, Timecard &card)
-{
-    const QString element = cursor.name();
-    if (element == kRevision)
-        return seen.first(cursor, kRevision) && take(cursor.readInteger(), card.revision);
-    if (element == kTmcardId)
-        return seen.first(cursor, kTmcardId) && take(cursor.readInteger(), card.id);
-    if (element == kName)
-        return seen.first(cursor, kName) && take(cursor.readText(), card.name);
-    if (element == kMapping)
-        return seen.first(cursor, kMapping) && take(cursor.copyContent(), card.mapping);
-    if (element == kCamList)
-        return seen.first(cursor, kCamList) && take(readCameraList(cursor), card.cameras);
-    unexpected(cursor, kTmcard);
-    return false;
-}
-
 // Reads the children of a <Tmcard> element, the cursor standing on it.
 std::optional<Timecard> readTimecard(XmlCursor &cursor, IdFields idFields)
 {
     Timecard card;
     Seen seen;
-    while (cursor.nextChild()) {
-        if (!readTimecardField(cursor, seen, card))
-            return std::nullopt;
-    }
-    if (cursor.refused())
+    const bool read = readFields(
+        cursor, kTmcard,
+        {{kRevision, [&](XmlCursor &c) { return take(c.readInteger(), card.revision); }},
+         {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), card.id); }},
+         {kName, [&](XmlCursor &c) { return take(c.readText(), card.name); }},
+         {kMapping, [&](XmlCursor &c) { return take(c.copyContent(), card.mapping); }},
+         {kCamList, [&](XmlCursor &c) { return take(readCameraList(c), card.cameras); }}},
+        seen);
+    if (!read)
         return std::nullopt;
     if (idFields == IdFields::Required && !seen.has(kRevision))
         return missing(cursor, kRevision, kTmcard);
@@ -219,23 +228,15 @@ Result<ReadRequest> parseReadRequest(const QString &body)
     static const QLatin1String all("TmcardAll");
     XmlCursor cursor(body);
     ReadRequest request;
-    if (enterRoot(cursor, root)) {
-        Seen seen;
-        while (cursor.nextChild()) {
-            bool read = false;
-            if (cursor.name() == all)
-                read = seen.first(cursor, all) && (request.all = readAllFlag(cursor));
-            else if (cursor.name() == kTmcardId)
-                read = seen.first(cursor, kTmcardId) && take(cursor.readInteger(), request.id);
-            else
-                unexpected(cursor, root);
-            if (!read)
-                break;
-        }
-        if (!cursor.refused() && seen.has(all) == seen.has(kTmcardId))
-            cursor.refuse(ServerCode::BadStructure,
-                          QStringLiteral("either <TmcardAll> or <TmcardID> is needed"));
-    }
+    Seen seen;
+    if (enterRoot(cursor, root) &&
+        readFields(cursor, root,
+                   {{all, [&](XmlCursor &c) { return request.all = readAllFlag(c); }},
+                    {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), request.id); }}},
+                   seen) &&
+        seen.has(all) == seen.has(kTmcardId))
+        cursor.refuse(ServerCode::BadStructure,
+                      QStringLiteral("either <TmcardAll> or <TmcardID> is needed"));
     return resultOf(cursor, std::optional<ReadRequest>(request));
 }
 
@@ -254,23 +255,16 @@ Result<DeleteRequest> parseDeleteRequest(const QString &body)
     static const QLatin1String root("DelTmcard");
     XmlCursor cursor(body);
     DeleteRequest request;
-    if (enterRoot(cursor, root)) {
-        Seen seen;
-        while (cursor.nextChild()) {
-            bool read = false;
-            if (cursor.name() == kRevision)
-                read =
-                    seen.first(cursor, kRevision) && take(cursor.readInteger(), request.revision);
-            else if (cursor.name() == kTmcardId)
-                read = seen.first(cursor, kTmcardId) && take(cursor.readInteger(), request.id);
-            else
-                unexpected(cursor, root);
-            if (!read)
-                break;
-        }
-        if (!cursor.refused() && !seen.has(kRevision))
+    Seen seen;
+    if (enterRoot(cursor, root) &&
+        readFields(
+            cursor, root,
+            {{kRevision, [&](XmlCursor &c) { return take(c.readInteger(), request.revision); }},
+             {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), request.id); }}},
+            seen)) {
+        if (!seen.has(kRevision))
             missing(cursor, kRevision, root);
-        else if (!cursor.refused() && !seen.has(kTmcardId))
+        else if (!seen.has(kTmcardId))
             missing(cursor, kTmcardId, root);
     }
     return resultOf(cursor, std::optional<DeleteRequest>(request));

@@ -122,6 +122,17 @@ public:
         return true;
     }
 
+    // The value once the transaction has committed, or why it did not.
+    template <typename T> Result<T> commit(Result<T> value)
+    {
+        if (value.refused())
+            return value;
+        const Refusal refusal = commit();
+        if (refusal.refused())
+            return refusal;
+        return value;
+    }
+
     Refusal commit()
     {
         if (m_failure.refused())
@@ -218,17 +229,12 @@ Result<std::vector<Timecard>> TimecardStore::read(std::optional<qint64> id)
     if (!transaction.active())
         return transaction.failure();
     Result<std::vector<Timecard>> cards = readCards(transaction, id);
-    if (cards.refused())
-        return cards;
-    if (!(*cards).empty()) {
+    if (!cards.refused() && !(*cards).empty()) {
         const Refusal refusal = readCameras(transaction, id, *cards);
         if (refusal.refused())
             return refusal;
     }
-    const Refusal committed = transaction.commit();
-    if (committed.refused())
-        return committed;
-    return cards;
+    return transaction.commit(std::move(cards));
 }
 
 Result<std::vector<Timecard>> TimecardStore::readCards(Transaction &transaction,
@@ -322,13 +328,7 @@ Result<qint64> TimecardStore::insert(const Timecard &card)
         return transaction.failure();
     Timecard stored = card;
     stored.revision = 1;
-    const Result<qint64> id = insertCard(transaction, stored, false);
-    if (id.refused())
-        return id;
-    const Refusal committed = transaction.commit();
-    if (committed.refused())
-        return committed;
-    return id;
+    return transaction.commit(insertCard(transaction, stored, false));
 }
 
 Refusal TimecardStore::checkRevision(Transaction &transaction, qint64 id, qint64 revision)
@@ -373,14 +373,12 @@ Result<qint64> TimecardStore::update(const Timecard &card)
     if (!transaction.exec(query) || !transaction.exec(clear))
         return transaction.failure();
     refusal = insertCameras(transaction, card.id, card.cameras);
-    if (!refusal.refused())
-        refusal = transaction.commit();
     if (refusal.refused())
         return refusal;
-    return revision;
+    return transaction.commit(Result<qint64>(revision));
 }
 
-Refusal TimecardStore::remove(qint64 id, qint64 revision)
+Result<qint64> TimecardStore::remove(qint64 id, qint64 revision)
 {
     Transaction transaction(database(), m_statementHook, true);
     if (!transaction.active())
@@ -394,7 +392,7 @@ Refusal TimecardStore::remove(qint64 id, qint64 revision)
     card.addBindValue(id);
     if (!transaction.exec(cameras) || !transaction.exec(card))
         return transaction.failure();
-    return transaction.commit();
+    return transaction.commit(Result<qint64>(id));
 }
 
 Refusal TimecardStore::replaceAll(const std::vector<Timecard> &cards)

@@ -34,7 +34,8 @@ public:
     Result<qint64> insert(const Timecard &card);
     // The time card's new revision.
     Result<qint64> update(const Timecard &card);
-    Refusal remove(qint64 id, qint64 revision);
+    // The removed time card's identifier.
+    Result<qint64> remove(qint64 id, qint64 revision);
     Refusal replaceAll(const std::vector<Timecard> &cards);
 
 private:
