@@ -122,6 +122,20 @@ public:
         return true;
     }
 
+    // Runs a query whose %1 stands for "WHERE <column> = ?" with the
+    // identifier bound, or for nothing when there is none.
+    std::optional<QSqlQuery> select(const QString &sql, QLatin1String column,
+                                    std::optional<qint64> id)
+    {
+        QSqlQuery query =
+            prepare(sql.arg(id ? QStringLiteral("WHERE %1 = ?").arg(column) : QString()));
+        if (id)
+            query.addBindValue(*id);
+        if (!exec(query))
+            return std::nullopt;
+        return query;
+    }
+
     // The value once the transaction has committed, or why it did not.
     template <typename T> Result<T> commit(Result<T> value)
     {
@@ -240,20 +254,18 @@ Result<std::vector<Timecard>> TimecardStore::read(std::optional<qint64> id)
 Result<std::vector<Timecard>> TimecardStore::readCards(Transaction &transaction,
                                                        std::optional<qint64> id)
 {
-    QSqlQuery query = transaction.prepare(
-        QStringLiteral("SELECT id, revision, name, mapping FROM tmcard %1 ORDER BY id")
-            .arg(id ? QStringLiteral("WHERE id = ?") : QString()));
-    if (id)
-        query.addBindValue(*id);
-    if (!transaction.exec(query))
+    std::optional<QSqlQuery> query = transaction.select(
+        QStringLiteral("SELECT id, revision, name, mapping FROM tmcard %1 ORDER BY id"),
+        QLatin1String("id"), id);
+    if (!query)
         return transaction.failure();
     std::vector<Timecard> cards;
-    while (query.next()) {
+    while (query->next()) {
         Timecard card;
-        card.id = query.value(0).toLongLong();
-        card.revision = query.value(1).toLongLong();
-        card.name = query.value(2).toString();
-        card.mapping = query.value(3).toString();
+        card.id = query->value(0).toLongLong();
+        card.revision = query->value(1).toLongLong();
+        card.name = query->value(2).toString();
+        card.mapping = query->value(3).toString();
         cards.push_back(std::move(card));
     }
     return cards;
@@ -263,22 +275,20 @@ Result<std::vector<Timecard>> TimecardStore::readCards(Transaction &transaction,
 Refusal TimecardStore::readCameras(Transaction &transaction, std::optional<qint64> id,
                                    std::vector<Timecard> &cards)
 {
-    QSqlQuery query = transaction.prepare(
-        QStringLiteral("SELECT tmcard_id, name, grp_id FROM cam %1 ORDER BY tmcard_id, position")
-            .arg(id ? QStringLiteral("WHERE tmcard_id = ?") : QString()));
-    if (id)
-        query.addBindValue(*id);
-    if (!transaction.exec(query))
+    std::optional<QSqlQuery> query = transaction.select(
+        QStringLiteral("SELECT tmcard_id, name, grp_id FROM cam %1 ORDER BY tmcard_id, position"),
+        QLatin1String("tmcard_id"), id);
+    if (!query)
         return transaction.failure();
     auto card = cards.begin();
-    while (query.next()) {
-        const qint64 owner = query.value(0).toLongLong();
+    while (query->next()) {
+        const qint64 owner = query->value(0).toLongLong();
         while (card != cards.end() && card->id < owner)
             ++card;
         if (card == cards.end())
             break;
         if (card->id == owner)
-            card->cameras.push_back({query.value(1).toString(), query.value(2).toLongLong()});
+            card->cameras.push_back({query->value(1).toString(), query->value(2).toLongLong()});
     }
     return {};
 }
