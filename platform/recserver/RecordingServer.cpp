@@ -101,7 +101,7 @@ Refusal RecordingServer::open()
 {
     if (m_open)
         return {};
-    const Refusal refusal = TimecardStore(m_connection, m_statementHook).open(m_path);
+    Refusal refusal = TimecardStore(m_connection, m_statementHook).open(m_path);
     m_open = !refusal.refused();
     if (!m_open)
         QSqlDatabase::removeDatabase(m_connection);

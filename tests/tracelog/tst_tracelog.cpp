@@ -132,6 +132,7 @@ TEST(QirnLogUtlThreads, ConcurrentWritersGiveWholeLinesOnlyAfterTheirOwnFilterCa
     std::int32_t module = 0;
     log->registerModule(log->context, 0, "Mod", &module);
     std::vector<std::thread> writers;
+    writers.reserve(4);
     for (int t = 0; t < 4; ++t) {
         writers.emplace_back([log, module, t] {
             const std::string filler(300, static_cast<char>('a' + t));
