@@ -87,22 +87,32 @@ template <typename T> bool take(std::optional<T> value, T &field)
 using FieldReader = std::function<bool(XmlCursor &)>;
 
 // Reads the children of the element the cursor stands on, each of one of the
-// given kinds and at most once, through its reader; false at the first
-// refusal. The kinds seen are in seen.
-bool readFields(XmlCursor &cursor, QLatin1String parent,
-                std::initializer_list<std::pair<QLatin1String, FieldReader>> fields, Seen &seen)
+// given kinds and at most once, through its reader. The kinds that came, or
+// none at the first refusal.
+std::optional<Seen> readFields(XmlCursor &cursor, QLatin1String parent,
+                               std::initializer_list<std::pair<QLatin1String, FieldReader>> fields)
 {
+    Seen seen;
     while (cursor.nextChild()) {
         const auto field = std::find_if(fields.begin(), fields.end(),
                                         [&](const auto &f) { return cursor.name() == f.first; });
-        if (field == fields.end()) {
-            unexpected(cursor, parent);
-            return false;
-        }
+        if (field == fields.end())
+            return unexpected(cursor, parent);
         if (!seen.first(cursor, field->first) || !field->second(cursor))
-            return false;
+            return std::nullopt;
     }
-    return !cursor.refused();
+    if (cursor.refused())
+        return std::nullopt;
+    return seen;
+}
+
+// readFields for the body's root, which must be the expected one.
+std::optional<Seen> readRoot(XmlCursor &cursor, QLatin1String root,
+                             std::initializer_list<std::pair<QLatin1String, FieldReader>> fields)
+{
+    if (!enterRoot(cursor, root))
+        return std::nullopt;
+    return readFields(cursor, root, fields);
 }
 
 // The request the body makes, or the first reason to refuse the body.
@@ -165,24 +175,22 @@ enum class IdFields { Required, Optional };
 std::optional<Timecard> readTimecard(XmlCursor &cursor, IdFields idFields)
 {
     Timecard card;
-    Seen seen;
-    const bool read = readFields(
+    const std::optional<Seen> seen = readFields(
         cursor, kTmcard,
         {{kRevision, [&](XmlCursor &c) { return take(c.readInteger(), card.revision); }},
          {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), card.id); }},
          {kName, [&](XmlCursor &c) { return take(c.readText(), card.name); }},
          {kMapping, [&](XmlCursor &c) { return take(c.copyContent(), card.mapping); }},
-         {kCamList, [&](XmlCursor &c) { return take(readCameraList(c), card.cameras); }}},
-        seen);
-    if (!read)
+         {kCamList, [&](XmlCursor &c) { return take(readCameraList(c), card.cameras); }}});
+    if (!seen)
         return std::nullopt;
-    if (idFields == IdFields::Required && !seen.has(kRevision))
+    if (idFields == IdFields::Required && !seen->has(kRevision))
         return missing(cursor, kRevision, kTmcard);
-    if (idFields == IdFields::Required && !seen.has(kTmcardId))
+    if (idFields == IdFields::Required && !seen->has(kTmcardId))
         return missing(cursor, kTmcardId, kTmcard);
-    if (!seen.has(kName))
+    if (!seen->has(kName))
         return missing(cursor, kName, kTmcard);
-    if (!seen.has(kMapping))
+    if (!seen->has(kMapping))
         return missing(cursor, kMapping, kTmcard);
     return card;
 }
@@ -224,17 +232,14 @@ bool readAllFlag(XmlCursor &cursor)
 
 Result<ReadRequest> parseReadRequest(const QString &body)
 {
-    static const QLatin1String root("GetRecTmcard");
     static const QLatin1String all("TmcardAll");
     XmlCursor cursor(body);
     ReadRequest request;
-    Seen seen;
-    if (enterRoot(cursor, root) &&
-        readFields(cursor, root,
-                   {{all, [&](XmlCursor &c) { return request.all = readAllFlag(c); }},
-                    {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), request.id); }}},
-                   seen) &&
-        seen.has(all) == seen.has(kTmcardId))
+    const std::optional<Seen> seen =
+        readRoot(cursor, QLatin1String("GetRecTmcard"),
+                 {{all, [&](XmlCursor &c) { return request.all = readAllFlag(c); }},
+                  {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), request.id); }}});
+    if (seen && seen->has(all) == seen->has(kTmcardId))
         cursor.refuse(ServerCode::BadStructure,
                       QStringLiteral("either <TmcardAll> or <TmcardID> is needed"));
     return resultOf(cursor, std::optional<ReadRequest>(request));
@@ -255,17 +260,14 @@ Result<DeleteRequest> parseDeleteRequest(const QString &body)
     static const QLatin1String root("DelTmcard");
     XmlCursor cursor(body);
     DeleteRequest request;
-    Seen seen;
-    if (enterRoot(cursor, root) &&
-        readFields(
-            cursor, root,
-            {{kRevision, [&](XmlCursor &c) { return take(c.readInteger(), request.revision); }},
-             {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), request.id); }}},
-            seen)) {
-        if (!seen.has(kRevision))
-            missing(cursor, kRevision, root);
-        else if (!seen.has(kTmcardId))
-            missing(cursor, kTmcardId, root);
+    const auto integer = [](qint64 &field) {
+        return [&field](XmlCursor &c) { return take(c.readInteger(), field); };
+    };
+    const std::optional<Seen> seen = readRoot(
+        cursor, root, {{kRevision, integer(request.revision)}, {kTmcardId, integer(request.id)}});
+    for (const QLatin1String required : {kRevision, kTmcardId}) {
+        if (seen && !seen->has(required) && !cursor.refused())
+            missing(cursor, required, root);
     }
     return resultOf(cursor, std::optional<DeleteRequest>(request));
 }
