@@ -1,8 +1,8 @@
 #include "RecordingServer.h"
 
+#include "Answers.h"
 #include "RequestParser.h"
 #include "TimecardStore.h"
-#include "XmlOut.h"
 
 #include <QSqlDatabase>
 
@@ -16,77 +16,74 @@ QString uniqueConnectionName()
     return QStringLiteral("recserver-%1").arg(++counter);
 }
 
-ServerAnswer refusalAnswer(const Refusal &refusal, AnswerLayout layout)
+const Refusal kNotOpen{ServerCode::StorageFailure, QStringLiteral("database not open")};
+
+// The answer to a request: the first refusal on the way, or the text that
+// write makes of the request and of what the store returned for it.
+template <typename Request, typename CarryOut, typename Write>
+ServerAnswer answer(const Result<Request> &request, AnswerLayout layout, CarryOut carryOut,
+                    Write write)
 {
-    QString content;
-    XmlOut out(&content, layout);
-    out.start(u"Error");
-    out.leaf(u"Code", serverCodeText(refusal.code));
-    out.leaf(u"Reason", refusal.reason);
-    out.end(u"Error");
-    out.finish();
-    return {serverCodeText(refusal.code), content};
+    if (request.refused())
+        return refusalAnswer(request.refusal(), layout);
+    const auto outcome = carryOut(*request);
+    if (outcome.refused())
+        return refusalAnswer(outcome.refusal(), layout);
+    return {serverCodeText(ServerCode::Ok), write(*request, *outcome)};
 }
 
-QString timecardsAnswer(const std::vector<Timecard> &cards, AnswerLayout layout)
+ServerAnswer answerRead(TimecardStore &store, const QString &body, AnswerLayout layout)
 {
-    QString content;
-    XmlOut out(&content, layout);
-    // Always a start and an end tag: readers cut the answer at both.
-    out.start(u"GetRecTmcardRes");
-    for (const Timecard &card : cards) {
-        out.start(u"Tmcard");
-        out.leaf(u"Revision", QString::number(card.revision));
-        out.leaf(u"TmcardID", QString::number(card.id));
-        out.leaf(u"Name", card.name);
-        out.start(u"Mapping");
-        out.content(card.mapping);
-        out.end(u"Mapping");
-        if (!card.cameras.empty()) {
-            out.start(u"CamList");
-            for (const Camera &camera : card.cameras) {
-                out.start(u"Cam");
-                out.leaf(u"Name", camera.name);
-                out.leaf(u"GrpID", QString::number(camera.group));
-                out.end(u"Cam");
-            }
-            out.end(u"CamList");
-        }
-        out.end(u"Tmcard");
-    }
-    out.end(u"GetRecTmcardRes");
-    out.finish();
-    return content;
+    return answer(
+        parseReadRequest(body), layout,
+        // An identifier that is not held is an empty answer, not a refusal.
+        [&](const ReadRequest &request) {
+            return store.read(request.all ? std::nullopt : std::optional<qint64>(request.id));
+        },
+        [&](const ReadRequest &, const std::vector<Timecard> &cards) {
+            return timecardsAnswer(cards, layout);
+        });
 }
 
-QString fieldsAnswer(QStringView root, std::initializer_list<std::pair<QStringView, qint64>> fields,
-                     AnswerLayout layout)
+ServerAnswer answerInsert(TimecardStore &store, const QString &body, AnswerLayout layout)
 {
-    QString content;
-    XmlOut out(&content, layout);
-    out.start(root);
-    for (const auto &field : fields)
-        out.leaf(field.first, QString::number(field.second));
-    out.end(root);
-    out.finish();
-    return content;
+    return answer(
+        parseInsertRequest(body), layout, [&](const Timecard &card) { return store.insert(card); },
+        [&](const Timecard &, qint64 id) {
+            return fieldsAnswer(u"InsRecTmcardRes", {{u"TmcardID", id}}, layout);
+        });
 }
+
+ServerAnswer answerUpdate(TimecardStore &store, const QString &body, AnswerLayout layout)
+{
+    return answer(
+        parseUpdateRequest(body), layout, [&](const Timecard &card) { return store.update(card); },
+        [&](const Timecard &card, qint64 revision) {
+            return fieldsAnswer(u"UpdRecTmcardRes",
+                                {{u"TmcardID", card.id}, {u"Revision", revision}}, layout);
+        });
+}
+
+ServerAnswer answerDelete(TimecardStore &store, const QString &body, AnswerLayout layout)
+{
+    return answer(
+        parseDeleteRequest(body), layout,
+        [&](const DeleteRequest &request) { return store.remove(request.id, request.revision); },
+        [&](const DeleteRequest &request, qint64) {
+            return fieldsAnswer(u"DelTmcardRes", {{u"TmcardID", request.id}}, layout);
+        });
+}
+
+using CommandHandler = ServerAnswer (*)(TimecardStore &, const QString &body, AnswerLayout);
+
+const std::pair<QLatin1String, CommandHandler> kCommands[] = {
+    {QLatin1String("GetRecTmcard"), &answerRead},
+    {QLatin1String("InsRecTmcard"), &answerInsert},
+    {QLatin1String("UpdRecTmcard"), &answerUpdate},
+    {QLatin1String("DelTmcard"), &answerDelete},
+};
 
 } // namespace
-
-bool parseAnswerLayout(const QString &text, AnswerLayout *layout)
-{
-    const QString word = text.trimmed().toLower();
-    if (word == QLatin1String("compact"))
-        *layout = AnswerLayout::Compact;
-    else if (word == QLatin1String("indented"))
-        *layout = AnswerLayout::Indented;
-    else if (word == QLatin1String("crlf"))
-        *layout = AnswerLayout::Crlf;
-    else
-        return false;
-    return true;
-}
 
 RecordingServer::RecordingServer(const QString &databasePath, AnswerLayout layout)
     : m_path(databasePath), m_connection(uniqueConnectionName()), m_layout(layout)
@@ -100,19 +97,15 @@ RecordingServer::~RecordingServer()
     }
 }
 
-bool RecordingServer::open(QString *error)
+Refusal RecordingServer::open()
 {
     if (m_open)
-        return true;
-    TimecardStore store(m_connection, m_statementHook);
-    QString reason;
-    m_open = store.open(m_path, &reason);
-    if (!m_open) {
+        return {};
+    Refusal refusal = TimecardStore(m_connection, m_statementHook).open(m_path);
+    m_open = !refusal.refused();
+    if (!m_open)
         QSqlDatabase::removeDatabase(m_connection);
-        if (error)
-            *error = reason;
-    }
-    return m_open;
+    return refusal;
 }
 
 bool RecordingServer::isOpen() const
@@ -124,58 +117,11 @@ ServerAnswer RecordingServer::handle(const QString &command, const QString &body
 {
     try {
         if (!m_open)
-            return refusalAnswer({ServerCode::StorageFailure, QStringLiteral("database not open")},
-                                 m_layout);
+            return refusalAnswer(kNotOpen, m_layout);
         TimecardStore store(m_connection, m_statementHook);
-        if (command == QLatin1String("GetRecTmcard")) {
-            ReadRequest request;
-            Refusal refusal = parseReadRequest(body, &request);
-            std::vector<Timecard> cards;
-            if (!refusal.refused() && request.all) {
-                refusal = store.readAll(&cards);
-            } else if (!refusal.refused()) {
-                // An identifier that is not held is an empty answer, not a refusal.
-                std::optional<Timecard> card;
-                refusal = store.readOne(request.id, &card);
-                if (card)
-                    cards.push_back(std::move(*card));
-            }
-            if (refusal.refused())
-                return refusalAnswer(refusal, m_layout);
-            return {serverCodeText(ServerCode::Ok), timecardsAnswer(cards, m_layout)};
-        }
-        if (command == QLatin1String("InsRecTmcard")) {
-            Timecard card;
-            Refusal refusal = parseInsertRequest(body, &card);
-            qint64 id = 0;
-            if (!refusal.refused())
-                refusal = store.insert(card, &id);
-            if (refusal.refused())
-                return refusalAnswer(refusal, m_layout);
-            return {serverCodeText(ServerCode::Ok),
-                    fieldsAnswer(u"InsRecTmcardRes", {{u"TmcardID", id}}, m_layout)};
-        }
-        if (command == QLatin1String("UpdRecTmcard")) {
-            Timecard card;
-            Refusal refusal = parseUpdateRequest(body, &card);
-            qint64 revision = 0;
-            if (!refusal.refused())
-                refusal = store.update(card, &revision);
-            if (refusal.refused())
-                return refusalAnswer(refusal, m_layout);
-            return {serverCodeText(ServerCode::Ok),
-                    fieldsAnswer(u"UpdRecTmcardRes",
-                                 {{u"TmcardID", card.id}, {u"Revision", revision}}, m_layout)};
-        }
-        if (command == QLatin1String("DelTmcard")) {
-            DeleteRequest request;
-            Refusal refusal = parseDeleteRequest(body, &request);
-            if (!refusal.refused())
-                refusal = store.remove(request.id, request.revision);
-            if (refusal.refused())
-                return refusalAnswer(refusal, m_layout);
-            return {serverCodeText(ServerCode::Ok),
-                    fieldsAnswer(u"DelTmcardRes", {{u"TmcardID", request.id}}, m_layout)};
+        for (const auto &[name, answer] : kCommands) {
+            if (command == name)
+                return answer(store, body, m_layout);
         }
         return refusalAnswer({ServerCode::UnknownCommand,
                               QStringLiteral("unknown command \"%1\"").arg(command.left(60))},
@@ -187,18 +133,14 @@ ServerAnswer RecordingServer::handle(const QString &command, const QString &body
     }
 }
 
-bool RecordingServer::seed(const QString &getRecTmcardResXml, QString *error)
+Refusal RecordingServer::seed(const QString &getRecTmcardResXml)
 {
-    Refusal refusal{ServerCode::StorageFailure, QStringLiteral("database not open")};
-    if (m_open) {
-        std::vector<Timecard> cards;
-        refusal = parseTimecardList(getRecTmcardResXml, &cards);
-        if (!refusal.refused())
-            refusal = TimecardStore(m_connection, m_statementHook).replaceAll(cards);
-    }
-    if (refusal.refused() && error)
-        *error = QStringLiteral("code %1: %2").arg(serverCodeText(refusal.code), refusal.reason);
-    return !refusal.refused();
+    if (!m_open)
+        return kNotOpen;
+    const Result<std::vector<Timecard>> cards = parseTimecardList(getRecTmcardResXml);
+    if (cards.refused())
+        return cards.refusal();
+    return TimecardStore(m_connection, m_statementHook).replaceAll(*cards);
 }
 
 QString RecordingServer::dump()
@@ -211,22 +153,4 @@ QString RecordingServer::dump()
 void RecordingServer::setStatementHook(std::function<void(int)> hook)
 {
     m_statementHook = std::move(hook);
-}
-
-QString RecordingServer::defaultTimecardName()
-{
-    return QStringLiteral("Default Schedule");
-}
-
-QString RecordingServer::defaultTimecardMapping()
-{
-    // One continuous time frame over the whole week.
-    return QStringLiteral(
-        "<Ele><Frame><Name>Always</Name><Holiday>false</Holiday><RepeatMod>Weekly</RepeatMod>"
-        "<DLMod>SingleDay</DLMod><Intervals><Ele B=\"0\" E=\"86400\"/></Intervals><DayList>"
-        "<Ele B=\"1.0\"/><Ele B=\"2.0\"/><Ele B=\"3.0\"/><Ele B=\"4.0\"/><Ele B=\"5.0\"/>"
-        "<Ele B=\"6.0\"/><Ele B=\"7.0\"/></DayList><Range><Period><TmS>2016-03-29 "
-        "00:00:00.000</TmS><TmE>2035-01-01 00:00:00.000</TmE></Period><End>false</End></Range>"
-        "<RepeatFreq>1</RepeatFreq></Frame><RecMode>Continuous</RecMode><AllEvent>true</AllEvent>"
-        "<Motion>true</Motion><ContMotNum>1</ContMotNum><DigiInput>3</DigiInput></Ele>");
 }

@@ -1,25 +1,12 @@
 #pragma once
 
+#include "AnswerLayout.h"
+#include "Refusal.h"
 #include "ServerCode.h"
 
 #include <QString>
 
 #include <functional>
-
-// How answers are laid out. Compact: no white space between elements.
-// Indented: one element per line, two spaces per level, LF line ends.
-// Crlf: one element per line, no indentation, CRLF line ends. The two line
-// layouts end with a line end after the root.
-enum class AnswerLayout { Compact, Indented, Crlf };
-
-// Reads "compact", "indented" or "crlf" (any letter case).
-bool parseAnswerLayout(const QString &text, AnswerLayout *layout);
-
-struct ServerAnswer
-{
-    QString code;    // "0" when the request was carried out; see ServerCode
-    QString content; // the XML answer; for a refusal an <Error> element
-};
 
 // The simulated recording server: answers "GetRecTmcard", "InsRecTmcard",
 // "UpdRecTmcard" and "DelTmcard" over one SQLite database file (WAL).
@@ -38,9 +25,9 @@ public:
     RecordingServer &operator=(const RecordingServer &) = delete;
 
     // Opens the database, creating the schema and the default time card on a
-    // fresh file. False (with a reason) when the file cannot be opened or
+    // fresh file. Refused, with the reason, when the file cannot be opened or
     // holds a schema this server does not know.
-    bool open(QString *error = nullptr);
+    Refusal open();
     bool isOpen() const;
 
     // One request. Never throws; every failure is a non-zero code, and a
@@ -48,8 +35,8 @@ public:
     ServerAnswer handle(const QString &command, const QString &body);
 
     // Replaces every time card with those of a "GetRecTmcardRes" document,
-    // identifiers and revisions kept. On failure nothing changes.
-    bool seed(const QString &getRecTmcardResXml, QString *error = nullptr);
+    // identifiers and revisions kept. When refused nothing changes.
+    Refusal seed(const QString &getRecTmcardResXml);
     // The "GetRecTmcardRes" answer to a read of all time cards.
     QString dump();
 
@@ -61,10 +48,6 @@ public:
     // with the statement's number (from 1). Tests use it to kill the process
     // in the middle of a write.
     void setStatementHook(std::function<void(int statement)> hook);
-
-    // The server's default time card, identifier 1 in a fresh database.
-    static QString defaultTimecardName();
-    static QString defaultTimecardMapping();
 
 private:
     QString m_path;

@@ -4,6 +4,10 @@
 
 #include <QLatin1String>
 
+#include <algorithm>
+#include <functional>
+#include <initializer_list>
+#include <optional>
 #include <unordered_set>
 
 namespace {
@@ -29,210 +33,250 @@ bool enterRoot(XmlCursor &cursor, QLatin1String expected)
     return true;
 }
 
-bool duplicate(XmlCursor &cursor, bool *seen)
+std::nullopt_t unexpected(XmlCursor &cursor, const QString &parent)
 {
-    if (*seen)
-        return !cursor.refuse(ServerCode::BadStructure,
-                              QStringLiteral("<%1> given twice").arg(cursor.name()));
-    *seen = true;
-    return false;
+    cursor.refuse(ServerCode::BadStructure,
+                  QStringLiteral("unexpected <%1> in <%2>").arg(cursor.name(), parent));
+    return std::nullopt;
 }
 
-bool unexpected(XmlCursor &cursor, const QString &parent)
+std::nullopt_t missing(XmlCursor &cursor, QLatin1String element, QLatin1String parent)
 {
-    return cursor.refuse(ServerCode::BadStructure,
-                         QStringLiteral("unexpected <%1> in <%2>").arg(cursor.name(), parent));
+    cursor.refuse(ServerCode::BadStructure,
+                  QStringLiteral("<%1> missing in <%2>").arg(element, parent));
+    return std::nullopt;
 }
 
-bool missing(XmlCursor &cursor, QLatin1String element, QLatin1String parent)
+std::nullopt_t badValue(XmlCursor &cursor, const QString &reason)
 {
-    return cursor.refuse(ServerCode::BadStructure,
-                         QStringLiteral("<%1> missing in <%2>").arg(element, parent));
+    cursor.refuse(ServerCode::BadValue, reason);
+    return std::nullopt;
 }
 
-bool readCamera(XmlCursor &cursor, Camera *camera)
+// The kinds of child element met so far in one element: each may come once.
+class Seen
 {
-    bool seenName = false;
-    bool seenGroup = false;
+public:
+    // False, with the refusal recorded, when an element of this kind came before.
+    bool first(XmlCursor &cursor, QLatin1String kind)
+    {
+        if (has(kind))
+            return cursor.refuse(ServerCode::BadStructure,
+                                 QStringLiteral("<%1> given twice").arg(cursor.name()));
+        m_kinds.push_back(kind);
+        return true;
+    }
+    bool has(QLatin1String kind) const
+    {
+        return std::find(m_kinds.begin(), m_kinds.end(), kind) != m_kinds.end();
+    }
+
+private:
+    std::vector<QLatin1String> m_kinds;
+};
+
+// Moves a value that was read into its field; false when the read was refused.
+template <typename T> bool take(std::optional<T> value, T &field)
+{
+    if (!value)
+        return false;
+    field = std::move(*value);
+    return true;
+}
+
+using FieldReader = std::function<bool(XmlCursor &)>;
+
+// Reads the children of the element the cursor stands on, each of one of the
+// given kinds and at most once, through its reader. The kinds that came, or
+// none at the first refusal.
+std::optional<Seen> readFields(XmlCursor &cursor, QLatin1String parent,
+                               std::initializer_list<std::pair<QLatin1String, FieldReader>> fields)
+{
+    Seen seen;
+    while (cursor.nextChild()) {
+        const auto field = std::find_if(fields.begin(), fields.end(),
+                                        [&](const auto &f) { return cursor.name() == f.first; });
+        if (field == fields.end())
+            return unexpected(cursor, parent);
+        if (!seen.first(cursor, field->first) || !field->second(cursor))
+            return std::nullopt;
+    }
+    if (cursor.refused())
+        return std::nullopt;
+    return seen;
+}
+
+// readFields for the body's root, which must be the expected one.
+std::optional<Seen> readRoot(XmlCursor &cursor, QLatin1String root,
+                             std::initializer_list<std::pair<QLatin1String, FieldReader>> fields)
+{
+    if (!enterRoot(cursor, root))
+        return std::nullopt;
+    return readFields(cursor, root, fields);
+}
+
+// The request the body makes, or the first reason to refuse the body.
+template <typename T> Result<T> resultOf(XmlCursor &cursor, std::optional<T> value)
+{
+    Refusal refusal = cursor.finish();
+    if (refusal.refused())
+        return refusal;
+    return std::move(*value);
+}
+
+std::optional<Camera> readCamera(XmlCursor &cursor)
+{
+    Camera camera;
+    Seen seen;
     while (cursor.nextChild()) {
         const QString element = cursor.name();
         if (element == kName) {
-            if (duplicate(cursor, &seenName) || !cursor.readText(&camera->name))
-                return false;
-            if (camera->name.trimmed().isEmpty())
-                return cursor.refuse(ServerCode::BadValue, QStringLiteral("empty camera name"));
+            if (!seen.first(cursor, kName) || !take(cursor.readText(), camera.name))
+                return std::nullopt;
+            if (camera.name.trimmed().isEmpty())
+                return badValue(cursor, QStringLiteral("empty camera name"));
         } else if (element == kRecGrpId || element == kGrpId) {
-            if (duplicate(cursor, &seenGroup) || !cursor.readInteger(&camera->group))
-                return false;
-            if (camera->group < 0)
-                return cursor.refuse(ServerCode::BadValue,
-                                     QStringLiteral("negative recording group"));
+            if (!seen.first(cursor, kRecGrpId) || !take(cursor.readInteger(), camera.group))
+                return std::nullopt;
+            if (camera.group < 0)
+                return badValue(cursor, QStringLiteral("negative recording group"));
         } else {
             return unexpected(cursor, kCam);
         }
     }
     if (cursor.refused())
-        return false;
-    if (!seenName)
+        return std::nullopt;
+    if (!seen.has(kName))
         return missing(cursor, kName, kCam);
-    if (!seenGroup)
+    if (!seen.has(kRecGrpId))
         return missing(cursor, kRecGrpId, kCam);
-    return true;
+    return camera;
 }
 
-bool readCameraList(XmlCursor &cursor, std::vector<Camera> *cameras)
+std::optional<std::vector<Camera>> readCameraList(XmlCursor &cursor)
 {
+    std::vector<Camera> cameras;
     while (cursor.nextChild()) {
         if (cursor.name() != kCam)
             return unexpected(cursor, kCamList);
-        Camera camera;
-        if (!readCamera(cursor, &camera))
-            return false;
-        cameras->push_back(std::move(camera));
+        std::optional<Camera> camera = readCamera(cursor);
+        if (!camera)
+            return std::nullopt;
+        cameras.push_back(std::move(*camera));
     }
-    return !cursor.refused();
+    if (cursor.refused())
+        return std::nullopt;
+    return cameras;
 }
 
 enum class IdFields { Required, Optional };
 
 // Reads the children of a <Tmcard> element, the cursor standing on it.
-bool readTimecard(XmlCursor &cursor, Timecard *card, IdFields idFields)
+std::optional<Timecard> readTimecard(XmlCursor &cursor, IdFields idFields)
 {
-    bool seenRevision = false;
-    bool seenId = false;
-    bool seenName = false;
-    bool seenMapping = false;
-    bool seenCameras = false;
-    while (cursor.nextChild()) {
-        const QString element = cursor.name();
-        bool read = false;
-        if (element == kRevision)
-            read = !duplicate(cursor, &seenRevision) && cursor.readInteger(&card->revision);
-        else if (element == kTmcardId)
-            read = !duplicate(cursor, &seenId) && cursor.readInteger(&card->id);
-        else if (element == kName)
-            read = !duplicate(cursor, &seenName) && cursor.readText(&card->name);
-        else if (element == kMapping)
-            read = !duplicate(cursor, &seenMapping) && cursor.copyContent(&card->mapping);
-        else if (element == kCamList)
-            read = !duplicate(cursor, &seenCameras) && readCameraList(cursor, &card->cameras);
-        else
-            return unexpected(cursor, kTmcard);
-        if (!read)
-            return false;
-    }
-    if (cursor.refused())
-        return false;
-    if (idFields == IdFields::Required && !seenRevision)
+    Timecard card;
+    const std::optional<Seen> seen = readFields(
+        cursor, kTmcard,
+        {{kRevision, [&](XmlCursor &c) { return take(c.readInteger(), card.revision); }},
+         {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), card.id); }},
+         {kName, [&](XmlCursor &c) { return take(c.readText(), card.name); }},
+         {kMapping, [&](XmlCursor &c) { return take(c.copyContent(), card.mapping); }},
+         {kCamList, [&](XmlCursor &c) { return take(readCameraList(c), card.cameras); }}});
+    if (!seen)
+        return std::nullopt;
+    if (idFields == IdFields::Required && !seen->has(kRevision))
         return missing(cursor, kRevision, kTmcard);
-    if (idFields == IdFields::Required && !seenId)
+    if (idFields == IdFields::Required && !seen->has(kTmcardId))
         return missing(cursor, kTmcardId, kTmcard);
-    if (!seenName)
+    if (!seen->has(kName))
         return missing(cursor, kName, kTmcard);
-    if (!seenMapping)
+    if (!seen->has(kMapping))
         return missing(cursor, kMapping, kTmcard);
-    return true;
+    return card;
 }
 
 // A body whose root holds exactly one <Tmcard>.
-Refusal parseTimecardBody(const QString &body, QLatin1String root, Timecard *card,
-                          IdFields idFields)
+Result<Timecard> parseTimecardBody(const QString &body, QLatin1String root, IdFields idFields)
 {
     XmlCursor cursor(body);
+    std::optional<Timecard> card;
     if (enterRoot(cursor, root)) {
-        bool seenCard = false;
+        Seen seen;
         while (cursor.nextChild()) {
             if (cursor.name() != kTmcard) {
                 unexpected(cursor, root);
                 break;
             }
-            if (duplicate(cursor, &seenCard) || !readTimecard(cursor, card, idFields))
+            if (!seen.first(cursor, kTmcard) || !(card = readTimecard(cursor, idFields)))
                 break;
         }
-        if (!cursor.refused() && !seenCard)
+        if (!cursor.refused() && !card)
             missing(cursor, kTmcard, root);
     }
-    return cursor.finish();
+    return resultOf(cursor, std::move(card));
+}
+
+// "true" (any letter case) or "1"; anything else is refused.
+bool readAllFlag(XmlCursor &cursor)
+{
+    const std::optional<QString> text = cursor.readText();
+    if (!text)
+        return false;
+    const QString word = text->trimmed();
+    if (word.compare(QLatin1String("true"), Qt::CaseInsensitive) != 0 && word != QLatin1String("1"))
+        return cursor.refuse(ServerCode::BadValue, QStringLiteral("<TmcardAll> other than true"));
+    return true;
 }
 
 } // namespace
 
-Refusal parseReadRequest(const QString &body, ReadRequest *request)
+Result<ReadRequest> parseReadRequest(const QString &body)
 {
-    static const QLatin1String root("GetRecTmcard");
     static const QLatin1String all("TmcardAll");
     XmlCursor cursor(body);
-    if (enterRoot(cursor, root)) {
-        bool seenAll = false;
-        bool seenId = false;
-        while (cursor.nextChild()) {
-            if (cursor.name() == all) {
-                QString text;
-                if (duplicate(cursor, &seenAll) || !cursor.readText(&text))
-                    break;
-                const QString word = text.trimmed();
-                if (word.compare(QLatin1String("true"), Qt::CaseInsensitive) != 0 &&
-                    word != QLatin1String("1")) {
-                    cursor.refuse(ServerCode::BadValue,
-                                  QStringLiteral("<TmcardAll> other than true"));
-                    break;
-                }
-                request->all = true;
-            } else if (cursor.name() == kTmcardId) {
-                if (duplicate(cursor, &seenId) || !cursor.readInteger(&request->id))
-                    break;
-            } else {
-                unexpected(cursor, root);
-                break;
-            }
-        }
-        if (!cursor.refused() && seenAll == seenId)
-            cursor.refuse(ServerCode::BadStructure,
-                          QStringLiteral("either <TmcardAll> or <TmcardID> is needed"));
-    }
-    return cursor.finish();
+    ReadRequest request;
+    const std::optional<Seen> seen =
+        readRoot(cursor, QLatin1String("GetRecTmcard"),
+                 {{all, [&](XmlCursor &c) { return request.all = readAllFlag(c); }},
+                  {kTmcardId, [&](XmlCursor &c) { return take(c.readInteger(), request.id); }}});
+    if (seen && seen->has(all) == seen->has(kTmcardId))
+        cursor.refuse(ServerCode::BadStructure,
+                      QStringLiteral("either <TmcardAll> or <TmcardID> is needed"));
+    return resultOf(cursor, std::optional<ReadRequest>(request));
 }
 
-Refusal parseInsertRequest(const QString &body, Timecard *card)
+Result<Timecard> parseInsertRequest(const QString &body)
 {
-    return parseTimecardBody(body, QLatin1String("InsRecTmcard"), card, IdFields::Optional);
+    return parseTimecardBody(body, QLatin1String("InsRecTmcard"), IdFields::Optional);
 }
 
-Refusal parseUpdateRequest(const QString &body, Timecard *card)
+Result<Timecard> parseUpdateRequest(const QString &body)
 {
-    return parseTimecardBody(body, QLatin1String("UpdRecTmcard"), card, IdFields::Required);
+    return parseTimecardBody(body, QLatin1String("UpdRecTmcard"), IdFields::Required);
 }
 
-Refusal parseDeleteRequest(const QString &body, DeleteRequest *request)
+Result<DeleteRequest> parseDeleteRequest(const QString &body)
 {
     static const QLatin1String root("DelTmcard");
     XmlCursor cursor(body);
-    if (enterRoot(cursor, root)) {
-        bool seenRevision = false;
-        bool seenId = false;
-        while (cursor.nextChild()) {
-            bool read = false;
-            if (cursor.name() == kRevision)
-                read = !duplicate(cursor, &seenRevision) && cursor.readInteger(&request->revision);
-            else if (cursor.name() == kTmcardId)
-                read = !duplicate(cursor, &seenId) && cursor.readInteger(&request->id);
-            else
-                unexpected(cursor, root);
-            if (!read)
-                break;
-        }
-        if (!cursor.refused() && !seenRevision)
-            missing(cursor, kRevision, root);
-        else if (!cursor.refused() && !seenId)
-            missing(cursor, kTmcardId, root);
+    DeleteRequest request;
+    const auto integer = [](qint64 &field) {
+        return [&field](XmlCursor &c) { return take(c.readInteger(), field); };
+    };
+    const std::optional<Seen> seen = readRoot(
+        cursor, root, {{kRevision, integer(request.revision)}, {kTmcardId, integer(request.id)}});
+    for (const QLatin1String required : {kRevision, kTmcardId}) {
+        if (seen && !seen->has(required) && !cursor.refused())
+            missing(cursor, required, root);
     }
-    return cursor.finish();
+    return resultOf(cursor, std::optional<DeleteRequest>(request));
 }
 
-Refusal parseTimecardList(const QString &document, std::vector<Timecard> *cards)
+Result<std::vector<Timecard>> parseTimecardList(const QString &document)
 {
     static const QLatin1String root("GetRecTmcardRes");
     XmlCursor cursor(document);
+    std::vector<Timecard> cards;
     std::unordered_set<qint64> ids;
     if (enterRoot(cursor, root)) {
         while (cursor.nextChild()) {
@@ -240,22 +284,20 @@ Refusal parseTimecardList(const QString &document, std::vector<Timecard> *cards)
                 unexpected(cursor, root);
                 break;
             }
-            Timecard card;
-            if (!readTimecard(cursor, &card, IdFields::Required))
+            std::optional<Timecard> card = readTimecard(cursor, IdFields::Required);
+            if (!card)
                 break;
-            if (card.id <= 0) {
-                cursor.refuse(
-                    ServerCode::BadValue,
-                    QStringLiteral("time card identifier %1 is not positive").arg(card.id));
-                break;
-            }
-            if (!ids.insert(card.id).second) {
-                cursor.refuse(ServerCode::BadValue,
-                              QStringLiteral("time card %1 given twice").arg(card.id));
+            if (card->id <= 0) {
+                badValue(cursor,
+                         QStringLiteral("time card identifier %1 is not positive").arg(card->id));
                 break;
             }
-            cards->push_back(std::move(card));
+            if (!ids.insert(card->id).second) {
+                badValue(cursor, QStringLiteral("time card %1 given twice").arg(card->id));
+                break;
+            }
+            cards.push_back(std::move(*card));
         }
     }
-    return cursor.finish();
+    return resultOf(cursor, std::optional<std::vector<Timecard>>(std::move(cards)));
 }

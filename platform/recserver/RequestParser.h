@@ -1,5 +1,6 @@
 #pragma once
 
+#include "Refusal.h"
 #include "Timecard.h"
 
 #include <QString>
@@ -22,12 +23,12 @@ struct DeleteRequest
     qint64 id = 0;
 };
 
-Refusal parseReadRequest(const QString &body, ReadRequest *request);
+Result<ReadRequest> parseReadRequest(const QString &body);
 // Revision and identifier are optional in an insert and ignored.
-Refusal parseInsertRequest(const QString &body, Timecard *card);
+Result<Timecard> parseInsertRequest(const QString &body);
 // A camera's group may come as "RecGrpID" (composed updates) or "GrpID"
 // (a time card text taken from a read answer).
-Refusal parseUpdateRequest(const QString &body, Timecard *card);
-Refusal parseDeleteRequest(const QString &body, DeleteRequest *request);
+Result<Timecard> parseUpdateRequest(const QString &body);
+Result<DeleteRequest> parseDeleteRequest(const QString &body);
 // Identifiers must be unique within the document.
-Refusal parseTimecardList(const QString &document, std::vector<Timecard> *cards);
+Result<std::vector<Timecard>> parseTimecardList(const QString &document);

@@ -22,3 +22,10 @@ inline QString serverCodeText(ServerCode code)
 {
     return QString::number(static_cast<int>(code));
 }
+
+// One answer of the server.
+struct ServerAnswer
+{
+    QString code;    // "0" when the request was carried out; see ServerCode
+    QString content; // the XML answer; for a refusal an <Error> element
+};

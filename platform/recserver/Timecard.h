@@ -1,7 +1,5 @@
 #pragma once
 
-#include "ServerCode.h"
-
 #include <QString>
 
 #include <vector>
@@ -22,13 +20,4 @@ struct Timecard
     QString name;
     QString mapping;
     std::vector<Camera> cameras;
-};
-
-// Why a request was not carried out; code Ok means it was.
-struct Refusal
-{
-    ServerCode code = ServerCode::Ok;
-    QString reason;
-
-    bool refused() const { return code != ServerCode::Ok; }
 };

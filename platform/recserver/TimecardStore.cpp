@@ -1,7 +1,5 @@
 #include "TimecardStore.h"
 
-#include "RecordingServer.h"
-
 #include <QSqlDatabase>
 #include <QSqlError>
 #include <QSqlQuery>
@@ -35,6 +33,43 @@ const char *const kSchema[] = {
     " grp_id INTEGER NOT NULL,"
     " PRIMARY KEY (tmcard_id, position)) WITHOUT ROWID",
 };
+
+Refusal openFailure(const QString &path, const QString &what, const QSqlError &error)
+{
+    return {ServerCode::StorageFailure, QStringLiteral("%1: %2: %3").arg(path, what, error.text())};
+}
+
+// WAL: readers on other connections never block the writer. NORMAL
+// synchronisation keeps every committed write across a process crash.
+Refusal configure(const QSqlDatabase &db, const QString &path)
+{
+    QSqlQuery pragma(db);
+    if (!pragma.exec(QStringLiteral("PRAGMA journal_mode=WAL")))
+        return openFailure(path, QStringLiteral("not a database"), pragma.lastError());
+    if (!pragma.exec(QStringLiteral("PRAGMA synchronous=NORMAL")) ||
+        !pragma.exec(QStringLiteral("PRAGMA foreign_keys=ON")))
+        return openFailure(path, QStringLiteral("settings"), pragma.lastError());
+    return {};
+}
+
+// The time card a fresh database holds: one continuous time frame over the
+// whole week.
+Timecard defaultTimecard()
+{
+    Timecard card;
+    card.id = 1;
+    card.revision = 1;
+    card.name = QStringLiteral("Default Schedule");
+    card.mapping = QStringLiteral(
+        "<Ele><Frame><Name>Always</Name><Holiday>false</Holiday><RepeatMod>Weekly</RepeatMod>"
+        "<DLMod>SingleDay</DLMod><Intervals><Ele B=\"0\" E=\"86400\"/></Intervals><DayList>"
+        "<Ele B=\"1.0\"/><Ele B=\"2.0\"/><Ele B=\"3.0\"/><Ele B=\"4.0\"/><Ele B=\"5.0\"/>"
+        "<Ele B=\"6.0\"/><Ele B=\"7.0\"/></DayList><Range><Period><TmS>2016-03-29 "
+        "00:00:00.000</TmS><TmE>2035-01-01 00:00:00.000</TmE></Period><End>false</End></Range>"
+        "<RepeatFreq>1</RepeatFreq></Frame><RecMode>Continuous</RecMode><AllEvent>true</AllEvent>"
+        "<Motion>true</Motion><ContMotNum>1</ContMotNum><DigiInput>3</DigiInput></Ele>");
+    return card;
+}
 
 } // namespace
 
@@ -87,6 +122,31 @@ public:
         return true;
     }
 
+    // Runs a query whose %1 stands for "WHERE <column> = ?" with the
+    // identifier bound, or for nothing when there is none.
+    std::optional<QSqlQuery> select(const QString &sql, QLatin1String column,
+                                    std::optional<qint64> id)
+    {
+        QSqlQuery query =
+            prepare(sql.arg(id ? QStringLiteral("WHERE %1 = ?").arg(column) : QString()));
+        if (id)
+            query.addBindValue(*id);
+        if (!exec(query))
+            return std::nullopt;
+        return query;
+    }
+
+    // The value once the transaction has committed, or why it did not.
+    template <typename T> Result<T> commit(Result<T> value)
+    {
+        if (value.refused())
+            return value;
+        const Refusal refusal = commit();
+        if (refusal.refused())
+            return refusal;
+        return value;
+    }
+
     Refusal commit()
     {
         if (m_failure.refused())
@@ -116,135 +176,121 @@ QSqlDatabase TimecardStore::database() const
     return QSqlDatabase::database(m_connection, false);
 }
 
-bool TimecardStore::open(const QString &path, QString *error)
+Refusal TimecardStore::open(const QString &path)
 {
     QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), m_connection);
     db.setDatabaseName(path);
     // Another connection to the same file (a second server, a seeding tool)
     // may hold the write lock for a moment.
     db.setConnectOptions(QStringLiteral("QSQLITE_BUSY_TIMEOUT=5000"));
-    const auto fail = [&](const QString &what, const QSqlError &sqlError) {
-        if (error)
-            *error = QStringLiteral("%1: %2: %3").arg(path, what, sqlError.text());
+    Refusal refusal = db.open() ? configure(db, path)
+                                : openFailure(path, QStringLiteral("cannot open"), db.lastError());
+    if (!refusal.refused())
+        refusal = prepareSchema(db, path);
+    if (refusal.refused())
         db.close();
-        return false;
-    };
-    if (!db.open())
-        return fail(QStringLiteral("cannot open"), db.lastError());
+    return refusal;
+}
 
-    QSqlQuery pragma(db);
-    // WAL: readers on other connections never block the writer. NORMAL
-    // synchronisation keeps every committed write across a process crash.
-    if (!pragma.exec(QStringLiteral("PRAGMA journal_mode=WAL")))
-        return fail(QStringLiteral("not a database"), pragma.lastError());
-    if (!pragma.exec(QStringLiteral("PRAGMA synchronous=NORMAL")) ||
-        !pragma.exec(QStringLiteral("PRAGMA foreign_keys=ON")))
-        return fail(QStringLiteral("settings"), pragma.lastError());
-
+Refusal TimecardStore::prepareSchema(const QSqlDatabase &db, const QString &path)
+{
     static const std::function<void(int)> noHook;
     Transaction transaction(db, noHook, true);
     if (!transaction.active())
-        return fail(QStringLiteral("begin"), db.lastError());
+        return openFailure(path, QStringLiteral("begin"), db.lastError());
     QSqlQuery version = transaction.prepare(QStringLiteral("PRAGMA user_version"));
     if (!transaction.exec(version) || !version.next())
-        return fail(QStringLiteral("schema version"), version.lastError());
+        return openFailure(path, QStringLiteral("schema version"), version.lastError());
     const int found = version.value(0).toInt();
     version.finish();
-    if (found == kSchemaVersion)
-        return transaction.commit().refused() ? fail(QStringLiteral("commit"), db.lastError())
-                                              : true;
-    if (found != 0) {
-        if (error)
-            *error = QStringLiteral("%1: schema version %2, this server knows %3")
-                         .arg(path)
-                         .arg(found)
-                         .arg(kSchemaVersion);
-        db.close();
-        return false;
+    if (found != 0 && found != kSchemaVersion)
+        return {ServerCode::StorageFailure,
+                QStringLiteral("%1: schema version %2, this server knows %3")
+                    .arg(path)
+                    .arg(found)
+                    .arg(kSchemaVersion)};
+    if (found == 0) {
+        const QSqlError error = createSchema(transaction);
+        if (error.isValid())
+            return openFailure(path, QStringLiteral("create schema"), error);
     }
+    if (transaction.commit().refused())
+        return openFailure(path,
+                           found == 0 ? QStringLiteral("create schema") : QStringLiteral("commit"),
+                           db.lastError());
+    return {};
+}
+
+QSqlError TimecardStore::createSchema(Transaction &transaction)
+{
     for (const char *statement : kSchema) {
         QSqlQuery create = transaction.prepare(QString::fromLatin1(statement));
         if (!transaction.exec(create))
-            return fail(QStringLiteral("create schema"), create.lastError());
+            return create.lastError();
     }
-    Timecard defaultCard;
-    defaultCard.id = 1;
-    defaultCard.revision = 1;
-    defaultCard.name = RecordingServer::defaultTimecardName();
-    defaultCard.mapping = RecordingServer::defaultTimecardMapping();
-    qint64 id = 0;
     QSqlQuery setVersion =
         transaction.prepare(QStringLiteral("PRAGMA user_version=%1").arg(kSchemaVersion));
-    if (insertCard(transaction, defaultCard, true, &id).refused() ||
-        !transaction.exec(setVersion) || transaction.commit().refused())
-        return fail(QStringLiteral("create schema"), db.lastError());
-    return true;
+    if (insertCard(transaction, defaultTimecard(), true).refused() || !transaction.exec(setVersion))
+        return database().lastError();
+    return {};
 }
 
-void TimecardStore::close()
-{
-    QSqlDatabase db = database();
-    db.close();
-}
-
-Refusal TimecardStore::readCards(const QString &where, qint64 id, std::vector<Timecard> *cards)
+Result<std::vector<Timecard>> TimecardStore::read(std::optional<qint64> id)
 {
     // Both statements read one snapshot: a writer on another connection
     // cannot slip between the time cards and their cameras.
     Transaction transaction(database(), m_statementHook, false);
     if (!transaction.active())
         return transaction.failure();
-    QSqlQuery cardQuery = transaction.prepare(
-        QStringLiteral("SELECT id, revision, name, mapping FROM tmcard %1 ORDER BY id").arg(where));
-    if (!where.isEmpty())
-        cardQuery.addBindValue(id);
-    if (!transaction.exec(cardQuery))
-        return transaction.failure();
-    while (cardQuery.next()) {
-        Timecard card;
-        card.id = cardQuery.value(0).toLongLong();
-        card.revision = cardQuery.value(1).toLongLong();
-        card.name = cardQuery.value(2).toString();
-        card.mapping = cardQuery.value(3).toString();
-        cards->push_back(std::move(card));
+    Result<std::vector<Timecard>> cards = readCards(transaction, id);
+    if (!cards.refused() && !(*cards).empty()) {
+        const Refusal refusal = readCameras(transaction, id, *cards);
+        if (refusal.refused())
+            return refusal;
     }
-    cardQuery.finish();
-    if (cards->empty())
-        return transaction.commit();
+    return transaction.commit(std::move(cards));
+}
 
-    QSqlQuery camQuery = transaction.prepare(
-        QStringLiteral("SELECT tmcard_id, name, grp_id FROM cam %1 ORDER BY tmcard_id, position")
-            .arg(where.isEmpty() ? QString() : QStringLiteral("WHERE tmcard_id = ?")));
-    if (!where.isEmpty())
-        camQuery.addBindValue(id);
-    if (!transaction.exec(camQuery))
+Result<std::vector<Timecard>> TimecardStore::readCards(Transaction &transaction,
+                                                       std::optional<qint64> id)
+{
+    std::optional<QSqlQuery> query = transaction.select(
+        QStringLiteral("SELECT id, revision, name, mapping FROM tmcard %1 ORDER BY id"),
+        QLatin1String("id"), id);
+    if (!query)
         return transaction.failure();
-    auto card = cards->begin();
-    while (camQuery.next()) {
-        const qint64 owner = camQuery.value(0).toLongLong();
-        while (card != cards->end() && card->id < owner)
+    std::vector<Timecard> cards;
+    while (query->next()) {
+        Timecard card;
+        card.id = query->value(0).toLongLong();
+        card.revision = query->value(1).toLongLong();
+        card.name = query->value(2).toString();
+        card.mapping = query->value(3).toString();
+        cards.push_back(std::move(card));
+    }
+    return cards;
+}
+
+// Puts each camera on its time card; cards are in identifier order.
+Refusal TimecardStore::readCameras(Transaction &transaction, std::optional<qint64> id,
+                                   std::vector<Timecard> &cards)
+{
+    std::optional<QSqlQuery> query = transaction.select(
+        QStringLiteral("SELECT tmcard_id, name, grp_id FROM cam %1 ORDER BY tmcard_id, position"),
+        QLatin1String("tmcard_id"), id);
+    if (!query)
+        return transaction.failure();
+    auto card = cards.begin();
+    while (query->next()) {
+        const qint64 owner = query->value(0).toLongLong();
+        while (card != cards.end() && card->id < owner)
             ++card;
-        if (card == cards->end())
+        if (card == cards.end())
             break;
         if (card->id == owner)
-            card->cameras.push_back({camQuery.value(1).toString(), camQuery.value(2).toLongLong()});
+            card->cameras.push_back({query->value(1).toString(), query->value(2).toLongLong()});
     }
-    camQuery.finish();
-    return transaction.commit();
-}
-
-Refusal TimecardStore::readAll(std::vector<Timecard> *cards)
-{
-    return readCards(QString(), 0, cards);
-}
-
-Refusal TimecardStore::readOne(qint64 id, std::optional<Timecard> *card)
-{
-    std::vector<Timecard> cards;
-    const Refusal refusal = readCards(QStringLiteral("WHERE id = ?"), id, &cards);
-    if (!refusal.refused() && !cards.empty())
-        *card = std::move(cards.front());
-    return refusal;
+    return {};
 }
 
 Refusal TimecardStore::insertCameras(Transaction &transaction, qint64 id,
@@ -264,8 +310,8 @@ Refusal TimecardStore::insertCameras(Transaction &transaction, qint64 id,
     return transaction.failure();
 }
 
-Refusal TimecardStore::insertCard(Transaction &transaction, const Timecard &card, bool keepId,
-                                  qint64 *id)
+Result<qint64> TimecardStore::insertCard(Transaction &transaction, const Timecard &card,
+                                         bool keepId)
 {
     QSqlQuery query = transaction.prepare(
         keepId
@@ -278,19 +324,21 @@ Refusal TimecardStore::insertCard(Transaction &transaction, const Timecard &card
     query.addBindValue(text(card.mapping));
     if (!transaction.exec(query))
         return transaction.failure();
-    *id = keepId ? card.id : query.lastInsertId().toLongLong();
-    return insertCameras(transaction, *id, card.cameras);
+    const qint64 id = keepId ? card.id : query.lastInsertId().toLongLong();
+    const Refusal refusal = insertCameras(transaction, id, card.cameras);
+    if (refusal.refused())
+        return refusal;
+    return id;
 }
 
-Refusal TimecardStore::insert(const Timecard &card, qint64 *newId)
+Result<qint64> TimecardStore::insert(const Timecard &card)
 {
     Transaction transaction(database(), m_statementHook, true);
     if (!transaction.active())
         return transaction.failure();
     Timecard stored = card;
     stored.revision = 1;
-    const Refusal refusal = insertCard(transaction, stored, false, newId);
-    return refusal.refused() ? refusal : transaction.commit();
+    return transaction.commit(insertCard(transaction, stored, false));
 }
 
 Refusal TimecardStore::checkRevision(Transaction &transaction, qint64 id, qint64 revision)
@@ -312,7 +360,7 @@ Refusal TimecardStore::checkRevision(Transaction &transaction, qint64 id, qint64
     return {};
 }
 
-Refusal TimecardStore::update(const Timecard &card, qint64 *newRevision)
+Result<qint64> TimecardStore::update(const Timecard &card)
 {
     Transaction transaction(database(), m_statementHook, true);
     if (!transaction.active())
@@ -321,11 +369,12 @@ Refusal TimecardStore::update(const Timecard &card, qint64 *newRevision)
     if (refusal.refused())
         return refusal;
     if (card.revision == std::numeric_limits<qint64>::max())
-        return {ServerCode::BadValue, QStringLiteral("revision cannot be raised further")};
+        return Refusal{ServerCode::BadValue, QStringLiteral("revision cannot be raised further")};
 
+    const qint64 revision = card.revision + 1;
     QSqlQuery query = transaction.prepare(
         QStringLiteral("UPDATE tmcard SET revision = ?, name = ?, mapping = ? WHERE id = ?"));
-    query.addBindValue(card.revision + 1);
+    query.addBindValue(revision);
     query.addBindValue(text(card.name));
     query.addBindValue(text(card.mapping));
     query.addBindValue(card.id);
@@ -336,11 +385,10 @@ Refusal TimecardStore::update(const Timecard &card, qint64 *newRevision)
     refusal = insertCameras(transaction, card.id, card.cameras);
     if (refusal.refused())
         return refusal;
-    *newRevision = card.revision + 1;
-    return transaction.commit();
+    return transaction.commit(Result<qint64>(revision));
 }
 
-Refusal TimecardStore::remove(qint64 id, qint64 revision)
+Result<qint64> TimecardStore::remove(qint64 id, qint64 revision)
 {
     Transaction transaction(database(), m_statementHook, true);
     if (!transaction.active())
@@ -354,7 +402,7 @@ Refusal TimecardStore::remove(qint64 id, qint64 revision)
     card.addBindValue(id);
     if (!transaction.exec(cameras) || !transaction.exec(card))
         return transaction.failure();
-    return transaction.commit();
+    return transaction.commit(Result<qint64>(id));
 }
 
 Refusal TimecardStore::replaceAll(const std::vector<Timecard> &cards)
@@ -370,10 +418,9 @@ Refusal TimecardStore::replaceAll(const std::vector<Timecard> &cards)
     if (!transaction.exec(cameras) || !transaction.exec(all) || !transaction.exec(sequence))
         return transaction.failure();
     for (const Timecard &card : cards) {
-        qint64 id = 0;
-        const Refusal refusal = insertCard(transaction, card, true, &id);
-        if (refusal.refused())
-            return refusal;
+        const Result<qint64> id = insertCard(transaction, card, true);
+        if (id.refused())
+            return id.refusal();
     }
     return transaction.commit();
 }

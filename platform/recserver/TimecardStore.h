@@ -1,5 +1,6 @@
 #pragma once
 
+#include "Refusal.h"
 #include "Timecard.h"
 
 #include <QString>
@@ -9,6 +10,7 @@
 #include <vector>
 
 class QSqlDatabase;
+class QSqlError;
 
 // The time cards in SQLite: tables "tmcard" and "cam", schema version in
 // PRAGMA user_version. Each write is one BEGIN IMMEDIATE transaction that is
@@ -21,25 +23,33 @@ public:
 
     TimecardStore(const QString &connectionName, const std::function<void(int)> &statementHook);
 
-    // Opens (creating on first use) the schema and the default time card.
-    bool open(const QString &path, QString *error);
-    void close();
+    // Opens the file, creating the schema and the default time card on
+    // first use: identifier 1, "Default Schedule", continuous all week.
+    Refusal open(const QString &path);
 
-    Refusal readAll(std::vector<Timecard> *cards);
-    Refusal readOne(qint64 id, std::optional<Timecard> *card);
-    Refusal insert(const Timecard &card, qint64 *newId);
-    Refusal update(const Timecard &card, qint64 *newRevision);
-    Refusal remove(qint64 id, qint64 revision);
+    // Every time card, or the one with this identifier (none when it is not
+    // held), in identifier order.
+    Result<std::vector<Timecard>> read(std::optional<qint64> id);
+    // The new time card's identifier.
+    Result<qint64> insert(const Timecard &card);
+    // The time card's new revision.
+    Result<qint64> update(const Timecard &card);
+    // The removed time card's identifier.
+    Result<qint64> remove(qint64 id, qint64 revision);
     Refusal replaceAll(const std::vector<Timecard> &cards);
 
 private:
     class Transaction;
 
     QSqlDatabase database() const;
-    Refusal readCards(const QString &where, qint64 id, std::vector<Timecard> *cards);
+    Refusal prepareSchema(const QSqlDatabase &db, const QString &path);
+    QSqlError createSchema(Transaction &transaction);
+    Result<std::vector<Timecard>> readCards(Transaction &transaction, std::optional<qint64> id);
+    Refusal readCameras(Transaction &transaction, std::optional<qint64> id,
+                        std::vector<Timecard> &cards);
     Refusal checkRevision(Transaction &transaction, qint64 id, qint64 revision);
     Refusal insertCameras(Transaction &transaction, qint64 id, const std::vector<Camera> &cameras);
-    Refusal insertCard(Transaction &transaction, const Timecard &card, bool keepId, qint64 *id);
+    Result<qint64> insertCard(Transaction &transaction, const Timecard &card, bool keepId);
 
     QString m_connection;
     const std::function<void(int)> &m_statementHook;

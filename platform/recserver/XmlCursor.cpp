@@ -102,49 +102,51 @@ bool XmlCursor::nextChild()
     }
 }
 
-bool XmlCursor::readText(QString *text)
+std::optional<QString> XmlCursor::readText()
 {
-    text->clear();
+    QString text;
     const QString element = name();
     for (;;) {
         switch (nextToken()) {
         case QXmlStreamReader::NoToken:
-            return false;
+            return std::nullopt;
         case QXmlStreamReader::Characters:
-            *text += m_reader.text();
+            text += m_reader.text();
             break;
         case QXmlStreamReader::EndElement:
-            return true;
+            return text;
         case QXmlStreamReader::StartElement:
-            return refuse(ServerCode::BadStructure,
-                          QStringLiteral("<%1> inside <%2>").arg(name(), element));
+            refuse(ServerCode::BadStructure,
+                   QStringLiteral("<%1> inside <%2>").arg(name(), element));
+            return std::nullopt;
         default:
             break;
         }
     }
 }
 
-bool XmlCursor::readInteger(qint64 *value)
+std::optional<qint64> XmlCursor::readInteger()
 {
     const QString element = name();
-    QString text;
-    if (!readText(&text))
-        return false;
-    const QString trimmed = text.trimmed();
+    const std::optional<QString> text = readText();
+    if (!text)
+        return std::nullopt;
+    const QString trimmed = text->trimmed();
     bool ok = false;
     const qint64 number = trimmed.toLongLong(&ok, 10);
-    if (!ok || trimmed.startsWith(QLatin1Char('+')))
-        return refuse(
+    if (!ok || trimmed.startsWith(QLatin1Char('+'))) {
+        refuse(
             ServerCode::BadValue,
-            QStringLiteral("<%1> is not a decimal integer: \"%2\"").arg(element, text.left(40)));
-    *value = number;
-    return true;
+            QStringLiteral("<%1> is not a decimal integer: \"%2\"").arg(element, text->left(40)));
+        return std::nullopt;
+    }
+    return number;
 }
 
-bool XmlCursor::copyContent(QString *xml)
+std::optional<QString> XmlCursor::copyContent()
 {
-    xml->clear();
-    XmlOut out(xml, AnswerLayout::Compact);
+    QString xml;
+    XmlOut out(&xml, AnswerLayout::Compact);
     // Elements open below the copied one, each with whether it has children
     // yet; white space is kept only as the whole text of a leaf element.
     std::vector<bool> hasChildren{false};
@@ -173,7 +175,7 @@ bool XmlCursor::copyContent(QString *xml)
     for (;;) {
         switch (nextToken()) {
         case QXmlStreamReader::NoToken:
-            return false;
+            return std::nullopt;
         case QXmlStreamReader::StartElement:
             flushStart();
             flushText(false);
@@ -191,7 +193,7 @@ bool XmlCursor::copyContent(QString *xml)
             flushStart();
             flushText(!hasChildren.back() && !open.empty());
             if (open.empty())
-                return true;
+                return xml;
             out.end(open.back());
             open.pop_back();
             hasChildren.pop_back();

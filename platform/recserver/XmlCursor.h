@@ -1,10 +1,12 @@
 #pragma once
 
-#include "Timecard.h"
+#include "Refusal.h"
 
 #include <QString>
 #include <QStringView>
 #include <QXmlStreamReader>
+
+#include <optional>
 
 // Walks a request body element by element and records the first reason to
 // refuse it. White space between elements, comments and processing
@@ -22,20 +24,20 @@ public:
     // of the current element or after a refusal.
     bool nextChild();
     QString name() const { return m_reader.qualifiedName().toString(); }
-    // The text of a leaf element, up to its end tag.
-    bool readText(QString *text);
+    // The text of a leaf element, up to its end tag; none when refused.
+    std::optional<QString> readText();
     // The element's content as canonical compact XML, up to its end tag:
     // white space between elements, comments and processing instructions
     // dropped, texts and attributes escaped again, empty-element tags kept.
-    bool copyContent(QString *xml);
+    std::optional<QString> copyContent();
     // Reads the rest of the document; returns the first refusal, if any.
     Refusal finish();
 
     bool refuse(ServerCode code, const QString &reason);
     bool refused() const { return m_refusal.refused(); }
 
-    // Readers of the common fields.
-    bool readInteger(qint64 *value);
+    // A leaf element's text as a decimal integer; none when refused.
+    std::optional<qint64> readInteger();
 
 private:
     bool xmlError();

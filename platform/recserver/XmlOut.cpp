@@ -2,8 +2,28 @@
 
 #include <QXmlStreamReader>
 
+#include <algorithm>
+#include <iterator>
+
 XmlOut::XmlOut(QString *out, AnswerLayout layout) : m_out(out), m_layout(layout)
 {}
+
+namespace {
+
+struct Entity
+{
+    char16_t character;
+    QLatin1String text;
+};
+
+// A raw CR would be folded into a line end by every reader.
+const Entity kEntities[] = {
+    {u'&', QLatin1String("&amp;")},   {u'<', QLatin1String("&lt;")},
+    {u'>', QLatin1String("&gt;")},    {u'"', QLatin1String("&quot;")},
+    {u'\'', QLatin1String("&apos;")}, {u'\r', QLatin1String("&#13;")},
+};
+
+} // namespace
 
 QString XmlOut::escaped(QStringView text)
 {
@@ -11,40 +31,24 @@ QString XmlOut::escaped(QStringView text)
     result.reserve(text.size());
     for (qsizetype i = 0; i < text.size(); ++i) {
         const QChar c = text[i];
-        switch (c.unicode()) {
-        case '&':
-            result += QLatin1String("&amp;");
-            break;
-        case '<':
-            result += QLatin1String("&lt;");
-            break;
-        case '>':
-            result += QLatin1String("&gt;");
-            break;
-        case '"':
-            result += QLatin1String("&quot;");
-            break;
-        case '\'':
-            result += QLatin1String("&apos;");
-            break;
-        // A raw CR would be folded into a line end by every reader.
-        case '\r':
-            result += QLatin1String("&#13;");
-            break;
-        case '\t':
-        case '\n':
+        // Most characters lie above every one that needs care.
+        if (c.unicode() > u'>' && c.unicode() < 0xD800) {
             result += c;
-            break;
-        default:
-            if (c.isHighSurrogate() && i + 1 < text.size() && text[i + 1].isLowSurrogate()) {
-                result += c;
-                result += text[++i];
-            } else if (c.unicode() < 0x20 || c.isSurrogate() || c.unicode() >= 0xFFFE) {
-                // Not a character XML can carry (a reason may quote raw input).
-                result += QChar(QChar::ReplacementCharacter);
-            } else {
-                result += c;
-            }
+            continue;
+        }
+        const auto entity = std::find_if(std::begin(kEntities), std::end(kEntities),
+                                         [c](const Entity &e) { return e.character == c; });
+        if (entity != std::end(kEntities)) {
+            result += entity->text;
+        } else if (c.isHighSurrogate() && i + 1 < text.size() && text[i + 1].isLowSurrogate()) {
+            result += c;
+            result += text[++i];
+        } else if ((c.unicode() < 0x20 && c != u'\t' && c != u'\n') || c.isSurrogate() ||
+                   c.unicode() >= 0xFFFE) {
+            // Not a character XML can carry (a reason may quote raw input).
+            result += QChar(QChar::ReplacementCharacter);
+        } else {
+            result += c;
         }
     }
     return result;

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "RecordingServer.h"
+#include "AnswerLayout.h"
 
 #include <QString>
 #include <QStringView>

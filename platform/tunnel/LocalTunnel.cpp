@@ -100,9 +100,8 @@ TunnelBackendFactory recordingServerBackend(const QString &databasePath, AnswerL
 {
     return [databasePath, layout, server]() -> StartedBackend {
         auto owned = std::make_shared<RecordingServer>(databasePath, layout);
-        QString error;
-        if (!owned->open(&error))
-            return {{}, error};
+        if (const Refusal refusal = owned->open(); refusal.refused())
+            return {{}, refusal.reason};
         if (server)
             *server = owned.get();
         return {[owned](const QString &command, const QString &body) {

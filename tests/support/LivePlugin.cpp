@@ -22,10 +22,9 @@ LivePlugin::LivePlugin()
 
 void LivePlugin::seed(const QString &getRecTmcardRes)
 {
-    QString error;
-    bool seeded = false;
-    m_tunnel->runOnBackend([&] { seeded = m_server->seed(getRecTmcardRes, &error); });
-    ASSERT_TRUE(seeded) << error.toStdString();
+    Refusal refusal;
+    m_tunnel->runOnBackend([&] { refusal = m_server->seed(getRecTmcardRes); });
+    ASSERT_FALSE(refusal.refused()) << refusal.text().toStdString();
 }
 
 QString LivePlugin::dump()

@@ -61,7 +61,7 @@ Options go before the command.
 Faults (--faults) are comma-separated, e.g. "latency=50ms,refuse=0.1,fail@3";
 the local tunnel's README lists them all.)";
 
-Result<qint64> wholeNumber(const QString &text, qint64 least, qint64 most, const char *mistake)
+HostResult<qint64> wholeNumber(const QString &text, qint64 least, qint64 most, const char *mistake)
 {
     bool ok = false;
     const qint64 value = text.toLongLong(&ok);
@@ -129,7 +129,7 @@ HostParser::HostParser()
 }
 
 // The command word and its arguments, checked against the table of commands.
-Result<HostOptions> readCommand(const QStringList &positional)
+HostResult<HostOptions> readCommand(const QStringList &positional)
 {
     if (positional.isEmpty())
         return Failure{QStringLiteral("no command given; see --help")};
@@ -150,7 +150,7 @@ Result<HostOptions> readCommand(const QStringList &positional)
 }
 
 // The options' values, added to the command's.
-Result<HostOptions> readOptions(const HostParser &host, HostOptions options)
+HostResult<HostOptions> readOptions(const HostParser &host, HostOptions options)
 {
     const QCommandLineParser &parser = host.parser;
     options.pluginFile = parser.isSet(host.plugin)
@@ -164,20 +164,20 @@ Result<HostOptions> readOptions(const HostParser &host, HostOptions options)
 
     const std::optional<qint64> clientId = clientNumber(parser.value(host.client));
     const bool traced = parser.isSet(host.traceLevel);
-    const Result<qint64> seed =
+    const HostResult<qint64> seed =
         wholeNumber(parser.value(host.seedFaults), 0, std::numeric_limits<qint64>::max(),
                     "--seed-faults takes a whole number of 0 or more");
-    const Result<qint64> timeout =
+    const HostResult<qint64> timeout =
         wholeNumber(parser.value(host.replyTimeout), 1, std::numeric_limits<qint32>::max(),
                     "--reply-timeout takes a whole number of milliseconds, 1 or more");
-    const Result<qint64> client =
-        clientId ? Result<qint64>(*clientId)
+    const HostResult<qint64> client =
+        clientId ? HostResult<qint64>(*clientId)
                  : Failure{QStringLiteral("--client takes a whole number from 0 to 2^53")};
-    const Result<qint64> level = traced ? wholeNumber(parser.value(host.traceLevel), 0, 255,
+    const HostResult<qint64> level = traced ? wholeNumber(parser.value(host.traceLevel), 0, 255,
                                                       "--trace-level takes a level from 0 to 255")
-                                        : Result<qint64>(0);
+                                        : HostResult<qint64>(0);
     // In this order: the first mistake is the one reported.
-    for (const Result<qint64> *number : {&seed, &timeout, &client, &level}) {
+    for (const HostResult<qint64> *number : {&seed, &timeout, &client, &level}) {
         if (!*number)
             return Failure{number->error()};
     }
@@ -191,7 +191,7 @@ Result<HostOptions> readOptions(const HostParser &host, HostOptions options)
 
 } // namespace
 
-Result<HostOptions> parseHostCommandLine(const QCoreApplication &app)
+HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app)
 {
     HostParser host;
     if (!host.parser.parse(app.arguments()))
@@ -200,7 +200,7 @@ Result<HostOptions> parseHostCommandLine(const QCoreApplication &app)
         host.parser.showHelp(0);
     if (host.parser.isSet(host.version))
         host.parser.showVersion();
-    Result<HostOptions> command = readCommand(host.parser.positionalArguments());
+    HostResult<HostOptions> command = readCommand(host.parser.positionalArguments());
     if (!command)
         return command;
     return readOptions(host, std::move(*command));

@@ -30,4 +30,4 @@ struct HostOptions
 // Reads the command line of the running application. --help and --version
 // print and end the process with status 0; any other mistake gives the
 // message for standard error.
-Result<HostOptions> parseHostCommandLine(const QCoreApplication &app);
+HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app);

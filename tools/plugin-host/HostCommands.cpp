@@ -21,7 +21,7 @@
 namespace {
 
 // Reads a whole file, or standard input for "-".
-Result<QByteArray> readInput(const QString &fileName)
+HostResult<QByteArray> readInput(const QString &fileName)
 {
     QFile file;
     const bool opened = fileName == QLatin1String("-")
@@ -46,15 +46,15 @@ int runRequests(const HostOptions &options, const std::vector<HostRequest> &requ
 
 // Opens the server's database on this thread, for the commands that work on
 // it without the plug-in.
-Result<std::shared_ptr<RecordingServer>> openServer(const HostOptions &options)
+HostResult<std::shared_ptr<RecordingServer>> openServer(const HostOptions &options)
 {
-    const Result<AnswerLayout> layout = answerLayout(options);
+    const HostResult<AnswerLayout> layout = answerLayout(options);
     if (!layout)
         return Failure{layout.error()};
     auto server = std::make_shared<RecordingServer>(databasePath(options), *layout);
-    QString error;
-    if (!server->open(&error))
-        return Failure{QStringLiteral("the server's database does not open: %1").arg(error)};
+    if (const Refusal refusal = server->open(); refusal.refused())
+        return Failure{
+            QStringLiteral("the server's database does not open: %1").arg(refusal.reason)};
     return server;
 }
 
@@ -134,7 +134,7 @@ int runRequest(const HostOptions &options)
     HostRequest request;
     request.command = options.arguments.at(0);
     if (options.arguments.size() > 1) {
-        const Result<QJsonValue> payload = JsonValues::parse(options.arguments.at(1).toUtf8());
+        const HostResult<QJsonValue> payload = JsonValues::parse(options.arguments.at(1).toUtf8());
         if (!payload) {
             printError(QStringLiteral("PAYLOAD is not JSON: %1").arg(payload.error()));
             return ExitUsage;
@@ -148,12 +148,12 @@ int runSession(const HostOptions &options)
 {
     const QString fileName =
         options.arguments.isEmpty() ? QStringLiteral("-") : options.arguments.first();
-    const Result<QByteArray> text = readInput(fileName);
+    const HostResult<QByteArray> text = readInput(fileName);
     if (!text) {
         printError(text.error());
         return ExitUsage;
     }
-    const Result<std::vector<HostRequest>> requests = readSession(*text);
+    const HostResult<std::vector<HostRequest>> requests = readSession(*text);
     if (!requests) {
         printError(QStringLiteral("%1: %2").arg(
             fileName == QLatin1String("-") ? QStringLiteral("standard input") : fileName,
@@ -165,19 +165,18 @@ int runSession(const HostOptions &options)
 
 int runSeed(const HostOptions &options)
 {
-    const Result<QByteArray> xml = readInput(options.arguments.first());
+    const HostResult<QByteArray> xml = readInput(options.arguments.first());
     if (!xml) {
         printError(xml.error());
         return ExitUsage;
     }
-    const Result<std::shared_ptr<RecordingServer>> server = openServer(options);
+    const HostResult<std::shared_ptr<RecordingServer>> server = openServer(options);
     if (!server) {
         printError(server.error());
         return ExitUsage;
     }
-    QString error;
-    if (!(*server)->seed(QString::fromUtf8(*xml), &error)) {
-        printError(QStringLiteral("%1: %2").arg(options.arguments.first(), error));
+    if (const Refusal refusal = (*server)->seed(QString::fromUtf8(*xml)); refusal.refused()) {
+        printError(QStringLiteral("%1: %2").arg(options.arguments.first(), refusal.text()));
         return ExitUsage;
     }
     return ExitOk;
@@ -185,7 +184,7 @@ int runSeed(const HostOptions &options)
 
 int runDump(const HostOptions &options)
 {
-    const Result<std::shared_ptr<RecordingServer>> server = openServer(options);
+    const HostResult<std::shared_ptr<RecordingServer>> server = openServer(options);
     if (!server) {
         printError(server.error());
         return ExitUsage;

@@ -31,7 +31,7 @@ std::optional<Failure> HostPlatform::loadPlugin()
 
 std::optional<Failure> HostPlatform::startTunnel()
 {
-    const Result<AnswerLayout> layout = answerLayout(m_options);
+    const HostResult<AnswerLayout> layout = answerLayout(m_options);
     if (!layout)
         return Failure{layout.error()};
     if (const std::optional<QString> reason = LocalTunnel::faultTextError(m_options.faults))
@@ -80,11 +80,10 @@ QString databasePath(const HostOptions &options)
     return QDir(folder).filePath(QStringLiteral("recording-server.sqlite"));
 }
 
-Result<AnswerLayout> answerLayout(const HostOptions &options)
+HostResult<AnswerLayout> answerLayout(const HostOptions &options)
 {
-    AnswerLayout layout = AnswerLayout::Compact;
-    if (!parseAnswerLayout(options.answerLayout, &layout))
-        return Failure{QStringLiteral("--answer-layout takes compact, indented or crlf, not \"%1\"")
-                           .arg(options.answerLayout)};
-    return layout;
+    if (const std::optional<AnswerLayout> layout = parseAnswerLayout(options.answerLayout))
+        return *layout;
+    return Failure{QStringLiteral("--answer-layout takes compact, indented or crlf, not \"%1\"")
+                       .arg(options.answerLayout)};
 }

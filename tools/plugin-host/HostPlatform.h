@@ -62,4 +62,4 @@ private:
 // folder is created.
 QString databasePath(const HostOptions &options);
 // The server's answer layout that --answer-layout names.
-Result<AnswerLayout> answerLayout(const HostOptions &options);
+HostResult<AnswerLayout> answerLayout(const HostOptions &options);

@@ -14,9 +14,9 @@ const QString CommandKey = QStringLiteral("command");
 const QString PayloadKey = QStringLiteral("payload");
 const QString ClientKey = QStringLiteral("client");
 
-Result<HostRequest> readLine(const QByteArray &line)
+HostResult<HostRequest> readLine(const QByteArray &line)
 {
-    const Result<QJsonValue> value = JsonValues::parse(line);
+    const HostResult<QJsonValue> value = JsonValues::parse(line);
     if (!value)
         return Failure{value.error()};
     if (!value->isObject())
@@ -62,7 +62,7 @@ std::optional<qint64> clientNumber(const QString &text)
     return value;
 }
 
-Result<std::vector<HostRequest>> readSession(const QByteArray &text)
+HostResult<std::vector<HostRequest>> readSession(const QByteArray &text)
 {
     std::vector<HostRequest> requests;
     QByteArray body = text;
@@ -73,7 +73,7 @@ Result<std::vector<HostRequest>> readSession(const QByteArray &text)
         const QByteArray line = lines.at(i).trimmed();
         if (line.isEmpty())
             continue;
-        Result<HostRequest> request = readLine(line);
+        HostResult<HostRequest> request = readLine(line);
         if (!request)
             return Failure{QStringLiteral("line %1: %2").arg(i + 1).arg(request.error())};
         requests.push_back(std::move(*request));

@@ -28,4 +28,4 @@ std::optional<qint64> clientNumber(const QString &text);
 // optional; blank lines are skipped. The whole text is checked before
 // anything is sent, so a bad line sends nothing: the requests, or
 // "line N: reason".
-Result<std::vector<HostRequest>> readSession(const QByteArray &text);
+HostResult<std::vector<HostRequest>> readSession(const QByteArray &text);

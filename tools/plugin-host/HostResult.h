@@ -12,11 +12,11 @@ struct Failure
 };
 
 // What a step makes, or why it failed.
-template <class T> class Result
+template <class T> class HostResult
 {
 public:
-    Result(T value) : m_value(std::move(value)) {}
-    Result(Failure failure) : m_failure(std::move(failure)) {}
+    HostResult(T value) : m_value(std::move(value)) {}
+    HostResult(Failure failure) : m_failure(std::move(failure)) {}
 
     explicit operator bool() const { return m_value.has_value(); }
     T &operator*() { return *m_value; }

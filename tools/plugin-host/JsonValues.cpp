@@ -7,7 +7,7 @@
 
 namespace JsonValues {
 
-Result<QJsonValue> parse(const QByteArray &text)
+HostResult<QJsonValue> parse(const QByteArray &text)
 {
     // QJsonDocument takes only objects and arrays; a scalar is read inside
     // an array of one.

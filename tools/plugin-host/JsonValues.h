@@ -13,7 +13,7 @@ namespace JsonValues {
 
 // Parses one JSON value; the reason when the text is not exactly one JSON
 // value.
-Result<QJsonValue> parse(const QByteArray &text);
+HostResult<QJsonValue> parse(const QByteArray &text);
 
 // A reply's data as JSON: an invalid variant is null.
 QJsonValue fromReplyData(const QVariant &data);

@@ -15,7 +15,7 @@ int main(int argc, char *argv[])
     QCoreApplication::setApplicationName(QStringLiteral("plugin-host"));
     QCoreApplication::setApplicationVersion(QStringLiteral(PLUGIN_HOST_VERSION));
 
-    const Result<HostOptions> options = parseHostCommandLine(app);
+    const HostResult<HostOptions> options = parseHostCommandLine(app);
     if (!options) {
         printError(options.error());
         return ExitUsage;
