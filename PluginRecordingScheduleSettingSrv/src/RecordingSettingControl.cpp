@@ -1,6 +1,7 @@
 #include "RecordingSettingControl.h"
 
 #include "RecordingScheduleSettingConstants.h"
+#include "TimecardReadings.h"
 #include "TimecardTemplate.h"
 #include "TraceLog.h"
 
@@ -191,9 +192,5 @@ void RecordingSettingControl::HdlrTunnelReqCallback(bool ok, const QString &, co
 
 QList<QVariant> RecordingSettingControl::TransContentAsList(const QVariant &content)
 {
-    if (!readable(content))
-        return {};
-    if (content.typeId() == QMetaType::QVariantList)
-        return content.toList();
-    return {content};
+    return TimecardReadings::asList(content);
 }

@@ -4,9 +4,10 @@
 
 #include "PluginRecordingScheduleSettingSrv.h"
 
+#include "FixedSchedule.h"
 #include "RecordingScheduleSettingConstants.h"
-#include "RecordingScheduleType.h"
 #include "TimecardReadings.h"
+#include "TriggerTable.h"
 
 #include <QJsonArray>
 #include <QJsonDocument>
@@ -20,60 +21,14 @@ using namespace TimecardReadings;
 
 namespace {
 
-struct TriggerKey
+// An element that may repeat, read as frames are: a missing or empty one
+// still counts as one entry, an empty map.
+QList<QVariant> atLeastOne(const QVariant &value)
 {
-    QLatin1String documentKey; // with its leading comma and trailing colon
-    QString element;
-};
-
-// Rows of the trigger event object that are always written, in order.
-const std::vector<TriggerKey> &alwaysWritten()
-{
-    static const std::vector<TriggerKey> keys{
-        {QLatin1String("\"motion\":"), QStringLiteral("Motion")},
-        {QLatin1String(",\"pir\":"), QStringLiteral("PIR")},
-        {QLatin1String(",\"tampering\":"), QStringLiteral("Tampering")},
-        {QLatin1String(",\"pptz\":"), QStringLiteral("PPTZTrigger")},
-        {QLatin1String(",\"lineDetection\":"), QStringLiteral("LineDetection")},
-        {QLatin1String(",\"fieldDetection\":"), QStringLiteral("FieldDetection")},
-        {QLatin1String(",\"loitering\":"), QStringLiteral("Loitering")},
-        {QLatin1String(",\"crowdDetection\":"), QStringLiteral("CrowdDetection")},
-        {QLatin1String(",\"missingObject\":"), QStringLiteral("MissingObject")},
-        {QLatin1String(",\"abandonObject\":"), QStringLiteral("AbandonObject")},
-        {QLatin1String(",\"faceDetection\":"), QStringLiteral("FaceDetection")},
-    };
-    return keys;
-}
-
-// Rows written only when the time card holds the element: servers that do
-// not know an analytic leave it out, and so does the document.
-const std::vector<TriggerKey> &writtenWhenPresent()
-{
-    static const std::vector<TriggerKey> keys{
-        {QLatin1String(",\"zoneDetection\":"), QStringLiteral("ZoneDetection")},
-        {QLatin1String(",\"smartTracking\":"), QStringLiteral("SmartTracking")},
-        {QLatin1String(",\"runningDetection\":"), QStringLiteral("RunningDetection")},
-        {QLatin1String(",\"parkingViolationDetection\":"),
-         QStringLiteral("ParkingViolationDetection")},
-        {QLatin1String(",\"restrictedZoneDetection\":"), QStringLiteral("RestrictedZoneDetection")},
-        {QLatin1String(",\"temperatureThresholdWarning\":"),
-         QStringLiteral("TemperatureThresholdWarning")},
-        {QLatin1String(",\"temperatureThresholdAlarm\":"),
-         QStringLiteral("TemperatureThresholdAlarm")},
-        {QLatin1String(",\"temperatureDifferenceWarning\":"),
-         QStringLiteral("TemperatureDifferenceWarning")},
-        {QLatin1String(",\"temperatureDifferenceAlarm\":"),
-         QStringLiteral("TemperatureDifferenceAlarm")},
-        {QLatin1String(",\"temperatureRiseWarning\":"), QStringLiteral("TemperatureRiseWarning")},
-        {QLatin1String(",\"temperatureRiseAlarm\":"), QStringLiteral("TemperatureRiseAlarm")},
-        {QLatin1String(",\"temperatureSectionAlarm\":"), QStringLiteral("TemperatureSectionAlarm")},
-        {QLatin1String(",\"thermalIntrusion\":"), QStringLiteral("ThermalIntrusion")},
-        {QLatin1String(",\"thermalMultiLoitering\":"), QStringLiteral("ThermalMultiLoitering")},
-        {QLatin1String(",\"fireSpotDetection\":"), QStringLiteral("FireSpotDetection")},
-        {QLatin1String(",\"smokerDetection\":"), QStringLiteral("SmokerDetection")},
-        {QLatin1String(",\"smokeAndFlameDetection\":"), QStringLiteral("SmokeAndFlameDetection")},
-    };
-    return keys;
+    QList<QVariant> list = asList(value);
+    if (list.isEmpty())
+        list.append(QVariant());
+    return list;
 }
 
 QLatin1String boolText(bool value)
@@ -114,7 +69,7 @@ QString quotedMode(const QString &mode)
 std::vector<std::pair<qint64, qint64>> dayRuns(const QVariant &days)
 {
     std::vector<std::pair<qint64, qint64>> runs;
-    for (const QVariant &entry : entries(days)) {
+    for (const QVariant &entry : atLeastOne(days)) {
         const qint64 day = dayNumber(entry.toMap().value(TimecardKey::AttrBegin));
         if (!runs.empty() && day == runs.back().second + 1)
             runs.back().second = day;
@@ -136,10 +91,10 @@ QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &
 
     QString document = QStringLiteral("{\"Rectangles\":[");
     for (const QVariant &entry : mappings) {
-        const VariantMap mapping = entry.toMap();
+        const QVariantMap mapping = entry.toMap();
         const QString modeText = text(mapping.value(TimecardKey::RecMode));
         const QString mode = quotedMode(modeText);
-        const VariantMap frame = mapping.value(TimecardKey::Frame).toMap();
+        const QVariantMap frame = mapping.value(TimecardKey::Frame).toMap();
 
         if (text(frame.value(TimecardKey::RepeatMod)) != TimecardKey::Weekly) {
             document += QLatin1String("{\"Bottom\":-1,\"Left\":-1,\"RecordingMode\":") + mode +
@@ -151,8 +106,8 @@ QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &
             dayRuns(frame.value(TimecardKey::DayList).toMap().value(TimecardKey::Ele));
         std::vector<std::pair<QString, QString>> intervals; // (Top, Bottom) texts
         for (const QVariant &interval :
-             entries(frame.value(TimecardKey::Intervals).toMap().value(TimecardKey::Ele))) {
-            const VariantMap bounds = interval.toMap();
+             atLeastOne(frame.value(TimecardKey::Intervals).toMap().value(TimecardKey::Ele))) {
+            const QVariantMap bounds = interval.toMap();
             intervals.emplace_back(hoursText(number(bounds.value(TimecardKey::AttrBegin))),
                                    hoursText(number(bounds.value(TimecardKey::AttrEnd))));
         }
@@ -192,31 +147,37 @@ QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &
     return document;
 }
 
-QString PluginRecordingScheduleSettingSrv::ParseTriggerEvents(const VariantMap &mapping) const
+QString PluginRecordingScheduleSettingSrv::ParseTriggerEvents(const QVariantMap &mapping) const
 {
     const int digitalInput = integer(mapping.value(TimecardKey::DigiInput));
     const bool falling = flag(mapping.value(TimecardKey::StopUntilDIFalling));
     const bool rising = flag(mapping.value(TimecardKey::StopUntilDIRising));
 
     QString triggers = QStringLiteral(",\"triggerEvents\":{");
-    for (const TriggerKey &key : alwaysWritten()) {
-        triggers += key.documentKey;
-        triggers += boolText(flag(mapping.value(key.element)));
-    }
-    for (const TriggerKey &key : writtenWhenPresent()) {
-        const auto found = mapping.constFind(key.element);
-        if (found == mapping.constEnd())
-            continue;
-        triggers += key.documentKey;
-        triggers += boolText(flag(*found));
-    }
+    // The rows of one kind in table order; an optional one only when the time
+    // card has its element: a server that does not know an analytic leaves
+    // it out, and so does the document.
+    const auto writeRows = [&](TriggerRow::Kind kind) {
+        for (const TriggerRow &row : triggerRows()) {
+            if (row.kind != kind)
+                continue;
+            const auto found = mapping.constFind(row.element);
+            if (kind == TriggerRow::OptionalFlag && found == mapping.constEnd())
+                continue;
+            if (!triggers.endsWith(QLatin1Char('{')))
+                triggers += QLatin1Char(',');
+            triggers += QLatin1Char('"');
+            triggers += row.key;
+            triggers += QLatin1String("\":");
+            triggers += boolText(found != mapping.constEnd() && flag(*found));
+        }
+    };
+    writeRows(TriggerRow::Flag);
+    writeRows(TriggerRow::OptionalFlag);
     triggers += QLatin1String(",\"di\":");
     triggers += boolText(digitalInput >= 1 || falling || rising);
     triggers += ParseDITraditionalRec(digitalInput);
-    triggers += QLatin1String(",\"activatedToNormal\":");
-    triggers += boolText(falling);
-    triggers += QLatin1String(",\"normalToActivated\":");
-    triggers += boolText(rising);
+    writeRows(TriggerRow::StopFlag);
     triggers += QLatin1Char('}');
     return triggers;
 }
@@ -228,13 +189,13 @@ QString PluginRecordingScheduleSettingSrv::ParseDITraditionalRec(int mode) const
            QLatin1String(",\"recordingStateNormal\":") + boolText(mode == 2 || mode == 3);
 }
 
-QString PluginRecordingScheduleSettingSrv::GetCustomizeSchedule(const VariantMap &timecard) const
+QString PluginRecordingScheduleSettingSrv::GetCustomizeSchedule(const QVariantMap &timecard) const
 {
     return ParseSchedule(
-        entries(timecard.value(TimecardKey::Mapping).toMap().value(TimecardKey::Ele)));
+        atLeastOne(timecard.value(TimecardKey::Mapping).toMap().value(TimecardKey::Ele)));
 }
 
-PluginRecordingScheduleSettingSrv::VariantMap
+QVariantMap
 PluginRecordingScheduleSettingSrv::ParseScheduleTimecard(const QList<QVariant> &timecards,
                                                          const QList<int> &timecardIds) const
 {
@@ -245,17 +206,14 @@ PluginRecordingScheduleSettingSrv::ParseScheduleTimecard(const QList<QVariant> &
     } else if (timecardIds.size() == 1) {
         const int wanted = timecardIds.constFirst();
         for (const QVariant &entry : timecards) {
-            const VariantMap timecard = entry.toMap();
+            const QVariantMap timecard = entry.toMap();
             if (integer(timecard.value(TimecardKey::TmcardID)) != wanted)
                 continue;
-            const QString name = text(timecard.value(TimecardKey::Name));
-            if (name == TimecardName::Customize) {
-                type = Customized;
-                content = GetCustomizeSchedule(timecard);
-            } else if (name == TimecardName::DefaultContinuous) {
-                type = DefaultContinuous;
-            } else if (name == TimecardName::DefaultEvent) {
-                type = DefaultEvent;
+            if (const FixedSchedule *fixed =
+                    FixedSchedule::byTimecardName(text(timecard.value(TimecardKey::Name)))) {
+                type = fixed->inForce;
+                if (type == Customized)
+                    content = GetCustomizeSchedule(timecard);
             }
             break;
         }
