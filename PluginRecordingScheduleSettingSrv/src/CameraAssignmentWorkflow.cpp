@@ -18,14 +18,28 @@ using namespace PluginRecordingScheduleSettingCommon;
 
 namespace {
 
-// The first entry of the payload's list under key, taken out: the payload
-// left describes what remains to do.
-QVariantMap takeFirstEntry(QVariantMap &remaining, const QString &key)
+// One entry of the payload's list under key, taken out, and the step
+// completion S that carries on through carryOn with what remains to do.
+struct Step
 {
+    QVariantMap entry;
+    ControlResultCallback done;
+};
+
+template <typename Plugin, typename CarryOn>
+std::optional<Step> takeStep(Plugin *plugin, CarryOn carryOn, const LifetimeGuard &guard,
+                             const QVariant &payload, const QString &key,
+                             const ResponseCallback &reply)
+{
+    QVariantMap remaining = payload.toMap();
     QList<QVariant> entries = remaining.value(key).toList();
+    if (entries.isEmpty())
+        return std::nullopt;
     const QVariantMap entry = entries.takeFirst().toMap();
     remaining.insert(key, entries);
-    return entry;
+    return Step{entry, guard.bind(reply, [plugin, carryOn, remaining, reply](bool ok, bool flag) {
+                    (plugin->*carryOn)(ok, flag, QVariant(remaining), reply);
+                })};
 }
 
 // The read completion of one entry: the time card's cameras changed, then
@@ -90,58 +104,51 @@ void PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingSchedule(cons
 bool PluginRecordingScheduleSettingSrv::RemoveCamerasFromSchedule(const QVariant &payload,
                                                                   ResponseCallback reply)
 {
-    QVariantMap remaining = payload.toMap();
-    if (remaining.value(PayloadKey::ScheduleRmvCam).toList().isEmpty())
+    const std::optional<Step> step = takeStep(
+        this, &PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingScheduleCallback,
+        m_lifetime, payload, PayloadKey::ScheduleRmvCam, reply);
+    if (!step)
         return false;
-    const QVariantMap entry = takeFirstEntry(remaining, PayloadKey::ScheduleRmvCam);
-    const ControlResultCallback step =
-        m_lifetime.bind(reply, [this, remaining, reply](bool ok, bool flag) {
-            HandleUpdateCameraRecordingScheduleCallback(ok, flag, remaining, reply);
-        });
-
     const int timecardId =
-        ClientInput::timecardId(entry.value(PayloadKey::ScheduleID).toString()).value_or(0);
+        ClientInput::timecardId(step->entry.value(PayloadKey::ScheduleID).toString()).value_or(0);
     const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
-    if (!control || !control->GetScheduleTimecardInfoById(
-                        timecardId, changeAfterRead(m_lifetime, reply, step, true,
-                                                    entry.value(PayloadKey::CamIDList).toList())))
-        step(false, true);
+    if (!control ||
+        !control->GetScheduleTimecardInfoById(
+            timecardId, changeAfterRead(m_lifetime, reply, step->done, true,
+                                        step->entry.value(PayloadKey::CamIDList).toList())))
+        step->done(false, true);
     return true;
 }
 
 bool PluginRecordingScheduleSettingSrv::AddCamerasToSchedule(const QVariant &payload,
                                                              ResponseCallback reply)
 {
-    QVariantMap remaining = payload.toMap();
-    if (remaining.value(PayloadKey::ScheduleAddCam).toList().isEmpty())
+    const std::optional<Step> step = takeStep(
+        this, &PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingScheduleCallback,
+        m_lifetime, payload, PayloadKey::ScheduleAddCam, reply);
+    if (!step)
         return false;
-    const QVariantMap entry = takeFirstEntry(remaining, PayloadKey::ScheduleAddCam);
-    const ControlResultCallback step =
-        m_lifetime.bind(reply, [this, remaining, reply](bool ok, bool flag) {
-            HandleUpdateCameraRecordingScheduleCallback(ok, flag, remaining, reply);
-        });
-
-    const QString timecardIdText = entry.value(PayloadKey::ScheduleID).toString();
-    const QList<QVariant> cameras = entry.value(PayloadKey::CamIDList).toList();
+    const QString timecardIdText = step->entry.value(PayloadKey::ScheduleID).toString();
+    const QList<QVariant> cameras = step->entry.value(PayloadKey::CamIDList).toList();
     const FixedSchedule *fixed = FixedSchedule::byAdditionEntry(timecardIdText);
     // A fixed time card is looked for first: creating it again would leave
     // two time cards of the same fixed name on the server.
-    const auto addToFixed = [this, fixed, cameras, reply, step](
+    const auto addToFixed = [this, fixed, cameras, reply, done = step->done](
                                 bool ok, bool, const QList<QVariant> &timecards, const QString &) {
         const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
         if (!ok || !control)
-            return step(false, true);
+            return done(false, true);
         const QVariantMap summary = fixed->summaryIn(*control, timecards);
         const std::optional<int> timecardId =
             ClientInput::timecardId(summary.value(TimecardKey::TmcardID).toString());
         const bool sent =
             summary.isEmpty()
-                ? fixed->create(*control, QString(), cameras, step)
+                ? fixed->create(*control, QString(), cameras, done)
                 : timecardId &&
                       control->GetScheduleTimecardInfoById(
-                          *timecardId, changeAfterRead(m_lifetime, reply, step, false, cameras));
+                          *timecardId, changeAfterRead(m_lifetime, reply, done, false, cameras));
         if (!sent)
-            step(false, true);
+            done(false, true);
     };
 
     const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
@@ -149,9 +156,9 @@ bool PluginRecordingScheduleSettingSrv::AddCamerasToSchedule(const QVariant &pay
         control && (fixed ? control->GetAllScheduleTimecardInfo(m_lifetime.bind(reply, addToFixed))
                           : control->GetScheduleTimecardInfoById(
                                 ClientInput::timecardId(timecardIdText).value_or(0),
-                                changeAfterRead(m_lifetime, reply, step, false, cameras)));
+                                changeAfterRead(m_lifetime, reply, step->done, false, cameras)));
     if (!sent)
-        step(false, true);
+        step->done(false, true);
     return true;
 }
 
