@@ -10,6 +10,7 @@ namespace {
 
 using Control = IRecordingSettingControl;
 using Cameras = QList<QVariant>;
+using Done = ControlResultCallback;
 using Summary = FixedSchedule::Summary;
 
 const QString None;
@@ -23,31 +24,27 @@ const std::array<FixedSchedule, 4> &rows()
         {ScheduleTypeWord::Continous, TimecardName::DefaultContinuous,
          Template::DefaultContinuousMapping, DefaultContinuousEntry, DefaultContinuous,
          &Control::GetDefaultContinousTimecardInfo,
-         [](Control &c, const QString &, const Cameras &cameras, ControlResultCallback done) {
-             return c.CreateDefaultContinuousTimecard(cameras, std::move(done));
+         [](Control &c, const QString &, const Cameras &k, Done d) {
+             return c.CreateDefaultContinuousTimecard(k, std::move(d));
          },
-         [](Control &c, const Summary &s, const QString &, const Cameras &cameras,
-            ControlResultCallback done) {
-             return c.UpdateDefaultContinuousTimecard(s, cameras, std::move(done));
+         [](Control &c, const Summary &s, const QString &, const Cameras &k, Done d) {
+             return c.UpdateDefaultContinuousTimecard(s, k, std::move(d));
          }},
         {ScheduleTypeWord::Event, TimecardName::DefaultEvent, Template::DefaultEventMapping,
          DefaultEventEntry, DefaultEvent, &Control::GetDefaultEventTimecardInfo,
-         [](Control &c, const QString &, const Cameras &cameras, ControlResultCallback done) {
-             return c.CreateDefaultEventTimecard(cameras, std::move(done));
+         [](Control &c, const QString &, const Cameras &k, Done d) {
+             return c.CreateDefaultEventTimecard(k, std::move(d));
          },
-         [](Control &c, const Summary &s, const QString &, const Cameras &cameras,
-            ControlResultCallback done) {
-             return c.UpdateDefaultEventTimecard(s, cameras, std::move(done));
+         [](Control &c, const Summary &s, const QString &, const Cameras &k, Done d) {
+             return c.UpdateDefaultEventTimecard(s, k, std::move(d));
          }},
         {ScheduleTypeWord::Customize, TimecardName::Customize, None, None, Customized,
          &Control::GetCustomizeTimecardInfo,
-         [](Control &c, const QString &content, const Cameras &cameras,
-            ControlResultCallback done) {
-             return c.CreateCustomizeTimecard(content, cameras, std::move(done));
+         [](Control &c, const QString &content, const Cameras &k, Done d) {
+             return c.CreateCustomizeTimecard(content, k, std::move(d));
          },
-         [](Control &c, const Summary &s, const QString &content, const Cameras &cameras,
-            ControlResultCallback done) {
-             return c.UpdateCustomizeTimecard(s, content, cameras, std::move(done));
+         [](Control &c, const Summary &s, const QString &content, const Cameras &k, Done d) {
+             return c.UpdateCustomizeTimecard(s, content, k, std::move(d));
          }},
         {ScheduleTypeWord::NotRecording, None, None, None, NoSchedule, nullptr, nullptr, nullptr},
     }};

@@ -157,12 +157,12 @@ QString PluginRecordingScheduleSettingSrv::ParseTriggerEvents(const QVariantMap 
     // The rows of one kind in table order; an optional one only when the time
     // card has its element: a server that does not know an analytic leaves
     // it out, and so does the document.
-    const auto writeRows = [&](TriggerRow::Kind kind) {
-        for (const TriggerRow &row : triggerRows()) {
+    const auto writeRows = [&](Triggers::Row::Kind kind) {
+        for (const Triggers::Row &row : Triggers::Rows) {
             if (row.kind != kind)
                 continue;
             const auto found = mapping.constFind(row.element);
-            if (kind == TriggerRow::OptionalFlag && found == mapping.constEnd())
+            if (kind == Triggers::Row::OptionalFlag && found == mapping.constEnd())
                 continue;
             if (!triggers.endsWith(QLatin1Char('{')))
                 triggers += QLatin1Char(',');
@@ -172,12 +172,12 @@ QString PluginRecordingScheduleSettingSrv::ParseTriggerEvents(const QVariantMap 
             triggers += boolText(found != mapping.constEnd() && flag(*found));
         }
     };
-    writeRows(TriggerRow::Flag);
-    writeRows(TriggerRow::OptionalFlag);
+    writeRows(Triggers::Row::Flag);
+    writeRows(Triggers::Row::OptionalFlag);
     triggers += QLatin1String(",\"di\":");
     triggers += boolText(digitalInput >= 1 || falling || rising);
     triggers += ParseDITraditionalRec(digitalInput);
-    writeRows(TriggerRow::StopFlag);
+    writeRows(Triggers::Row::StopFlag);
     triggers += QLatin1Char('}');
     return triggers;
 }

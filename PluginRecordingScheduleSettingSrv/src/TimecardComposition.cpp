@@ -119,12 +119,12 @@ RecordingSettingControl::ComposeTriggerEventsMsg(const QMap<QString, QVariant> &
     QString text;
     QXmlStreamWriter writer(&text);
     writer.setAutoFormatting(false);
-    for (const TriggerRow &row : triggerRows()) {
+    for (const Triggers::Row &row : Triggers::Rows) {
         switch (row.kind) {
-        case TriggerRow::MotionCount:
+        case Triggers::Row::MotionCount:
             writer.writeTextElement(row.element, QStringLiteral("1"));
             break;
-        case TriggerRow::DigitalInput:
+        case Triggers::Row::DigitalInput:
             writer.writeTextElement(row.element, GetDITraditionalRecMode(triggers));
             break;
         default:
