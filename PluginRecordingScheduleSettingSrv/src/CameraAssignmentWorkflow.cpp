@@ -143,7 +143,7 @@ bool PluginRecordingScheduleSettingSrv::AddCamerasToSchedule(const QVariant &pay
             ClientInput::timecardId(summary.value(TimecardKey::TmcardID).toString());
         const bool sent =
             summary.isEmpty()
-                ? fixed->create(*control, QString(), cameras, done)
+                ? fixed->put(*control, summary, QString(), cameras, done)
                 : timecardId &&
                       control->GetScheduleTimecardInfoById(
                           *timecardId, changeAfterRead(m_lifetime, reply, done, false, cameras));

@@ -9,51 +9,15 @@ using namespace PluginRecordingScheduleSettingCommon;
 namespace {
 
 using Control = IRecordingSettingControl;
-using Cameras = QList<QVariant>;
-using Done = ControlResultCallback;
-using Summary = FixedSchedule::Summary;
 
 const QString None;
 // Addition entries of "UpdateCamRecSchedule" that stand for the default time cards.
 const QString DefaultEventEntry = QStringLiteral("-2");
 const QString DefaultContinuousEntry = QStringLiteral("-3");
 
-const std::array<FixedSchedule, 4> &rows()
-{
-    static const std::array<FixedSchedule, 4> rows{{
-        {ScheduleTypeWord::Continous, TimecardName::DefaultContinuous,
-         Template::DefaultContinuousMapping, DefaultContinuousEntry, DefaultContinuous,
-         &Control::GetDefaultContinousTimecardInfo,
-         [](Control &c, const QString &, const Cameras &k, Done d) {
-             return c.CreateDefaultContinuousTimecard(k, std::move(d));
-         },
-         [](Control &c, const Summary &s, const QString &, const Cameras &k, Done d) {
-             return c.UpdateDefaultContinuousTimecard(s, k, std::move(d));
-         }},
-        {ScheduleTypeWord::Event, TimecardName::DefaultEvent, Template::DefaultEventMapping,
-         DefaultEventEntry, DefaultEvent, &Control::GetDefaultEventTimecardInfo,
-         [](Control &c, const QString &, const Cameras &k, Done d) {
-             return c.CreateDefaultEventTimecard(k, std::move(d));
-         },
-         [](Control &c, const Summary &s, const QString &, const Cameras &k, Done d) {
-             return c.UpdateDefaultEventTimecard(s, k, std::move(d));
-         }},
-        {ScheduleTypeWord::Customize, TimecardName::Customize, None, None, Customized,
-         &Control::GetCustomizeTimecardInfo,
-         [](Control &c, const QString &content, const Cameras &k, Done d) {
-             return c.CreateCustomizeTimecard(content, k, std::move(d));
-         },
-         [](Control &c, const Summary &s, const QString &content, const Cameras &k, Done d) {
-             return c.UpdateCustomizeTimecard(s, content, k, std::move(d));
-         }},
-        {ScheduleTypeWord::NotRecording, None, None, None, NoSchedule, nullptr, nullptr, nullptr},
-    }};
-    return rows;
-}
-
 template <typename Matches> const FixedSchedule *findRow(Matches matches)
 {
-    for (const FixedSchedule &row : rows()) {
+    for (const FixedSchedule &row : FixedSchedule::all()) {
         if (matches(row))
             return &row;
     }
@@ -61,6 +25,23 @@ template <typename Matches> const FixedSchedule *findRow(Matches matches)
 }
 
 } // namespace
+
+const std::array<FixedSchedule, 4> &FixedSchedule::all()
+{
+    static const std::array<FixedSchedule, 4> rows{{
+        {ScheduleTypeWord::Continous, TimecardName::DefaultContinuous,
+         Template::DefaultContinuousMapping, DefaultContinuousEntry, DefaultContinuous,
+         &Control::GetDefaultContinousTimecardInfo, &Control::CreateDefaultContinuousTimecard,
+         &Control::UpdateDefaultContinuousTimecard},
+        {ScheduleTypeWord::Event, TimecardName::DefaultEvent, Template::DefaultEventMapping,
+         DefaultEventEntry, DefaultEvent, &Control::GetDefaultEventTimecardInfo,
+         &Control::CreateDefaultEventTimecard, &Control::UpdateDefaultEventTimecard},
+        {ScheduleTypeWord::Customize, TimecardName::Customize, None, None, Customized,
+         &Control::GetCustomizeTimecardInfo, nullptr, nullptr},
+        {ScheduleTypeWord::NotRecording, None, None, None, NoSchedule, nullptr, nullptr, nullptr},
+    }};
+    return rows;
+}
 
 FixedSchedule::Summary FixedSchedule::summaryIn(IRecordingSettingControl &control,
                                                 const QList<QVariant> &timecards) const
@@ -74,23 +55,12 @@ bool FixedSchedule::put(IRecordingSettingControl &control, const Summary &summar
 {
     if (!hasTimecard())
         return false;
-    return summary.isEmpty() ? create(control, content, cameras, std::move(done))
-                             : update(control, summary, content, cameras, std::move(done));
-}
-
-const FixedSchedule &FixedSchedule::continuous()
-{
-    return rows()[0];
-}
-
-const FixedSchedule &FixedSchedule::event()
-{
-    return rows()[1];
-}
-
-const FixedSchedule &FixedSchedule::customize()
-{
-    return rows()[2];
+    const bool missing = summary.isEmpty();
+    if (!mapping.isEmpty())
+        return missing ? (control.*create)(cameras, std::move(done))
+                       : (control.*update)(summary, cameras, std::move(done));
+    return missing ? control.CreateCustomizeTimecard(content, cameras, std::move(done))
+                   : control.UpdateCustomizeTimecard(summary, content, cameras, std::move(done));
 }
 
 const FixedSchedule *FixedSchedule::byWord(const QString &word)
