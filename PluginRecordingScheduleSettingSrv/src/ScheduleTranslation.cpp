@@ -13,6 +13,7 @@
 #include <QJsonDocument>
 
 #include <algorithm>
+#include <array>
 #include <utility>
 #include <vector>
 
@@ -79,67 +80,83 @@ std::vector<std::pair<qint64, qint64>> dayRuns(const QVariant &days)
     return runs;
 }
 
+// The trigger elements as keys of a time card's map, made once: a document
+// of many event frames would otherwise make them again for every frame.
+const std::array<QString, Triggers::Rows.size()> &elementKeys()
+{
+    static const auto keys = [] {
+        std::array<QString, Triggers::Rows.size()> made;
+        for (std::size_t i = 0; i < made.size(); ++i)
+            made[i] = Triggers::Rows[i].element;
+        return made;
+    }();
+    return keys;
+}
+
+// The (Top, Bottom) texts of a frame's intervals, in hours.
+std::vector<std::pair<QString, QString>> intervals(const QVariant &entries)
+{
+    std::vector<std::pair<QString, QString>> texts;
+    for (const QVariant &interval : atLeastOne(entries)) {
+        const QVariantMap bounds = interval.toMap();
+        texts.emplace_back(hoursText(number(bounds.value(TimecardKey::AttrBegin))),
+                           hoursText(number(bounds.value(TimecardKey::AttrEnd))));
+    }
+    return texts;
+}
+
+// One rectangle per day run and interval, each followed by a comma. Appended
+// in place and grown ahead, doubling: a document of many event frames runs
+// to tens of megabytes, and growing it rectangle by rectangle spends the
+// time copying it.
+void appendRectangles(QString &document, const std::vector<std::pair<qint64, qint64>> &runs,
+                      const std::vector<std::pair<QString, QString>> &intervals,
+                      const QString &mode, const QString &triggers)
+{
+    const qsizetype perRectangle = 96 + mode.size() + triggers.size();
+    const qsizetype needed =
+        document.size() + qsizetype(runs.size() * intervals.size()) * perRectangle;
+    if (needed > document.capacity())
+        document.reserve(std::max(needed, 2 * document.capacity()));
+    for (const auto &[left, right] : runs) {
+        const QString leftText = QString::number(left);
+        const QString rightText = QString::number(right);
+        for (const auto &[top, bottom] : intervals) {
+            document += QLatin1String("{\"Bottom\":");
+            document += bottom;
+            document += QLatin1String(",\"Left\":");
+            document += leftText;
+            document += QLatin1String(",\"RecordingMode\":");
+            document += mode;
+            document += QLatin1String(",\"Right\":");
+            document += rightText;
+            document += QLatin1String(",\"Top\":");
+            document += top;
+            document += triggers;
+            document += QLatin1String("},");
+        }
+    }
+}
+
 } // namespace
 
 QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &mappings) const
 {
-    static const QLatin1String bottomKey("{\"Bottom\":");
-    static const QLatin1String leftKey(",\"Left\":");
-    static const QLatin1String modeKey(",\"RecordingMode\":");
-    static const QLatin1String rightKey(",\"Right\":");
-    static const QLatin1String topKey(",\"Top\":");
-
     QString document = QStringLiteral("{\"Rectangles\":[");
     for (const QVariant &entry : mappings) {
         const QVariantMap mapping = entry.toMap();
         const QString modeText = text(mapping.value(TimecardKey::RecMode));
         const QString mode = quotedMode(modeText);
         const QVariantMap frame = mapping.value(TimecardKey::Frame).toMap();
-
         if (text(frame.value(TimecardKey::RepeatMod)) != TimecardKey::Weekly) {
             document += QLatin1String("{\"Bottom\":-1,\"Left\":-1,\"RecordingMode\":") + mode +
                         QLatin1String(",\"Right\":-1,\"Top\":-1},");
             continue;
         }
-
-        const auto runs =
-            dayRuns(frame.value(TimecardKey::DayList).toMap().value(TimecardKey::Ele));
-        std::vector<std::pair<QString, QString>> intervals; // (Top, Bottom) texts
-        for (const QVariant &interval :
-             atLeastOne(frame.value(TimecardKey::Intervals).toMap().value(TimecardKey::Ele))) {
-            const QVariantMap bounds = interval.toMap();
-            intervals.emplace_back(hoursText(number(bounds.value(TimecardKey::AttrBegin))),
-                                   hoursText(number(bounds.value(TimecardKey::AttrEnd))));
-        }
-        const QString triggers =
-            modeText == RecordingMode::Event ? ParseTriggerEvents(mapping) : QString();
-
-        // Grown ahead, doubling: a document of many event frames runs to tens
-        // of megabytes, and growing it rectangle by rectangle spends the time
-        // copying it.
-        const qsizetype perRectangle = 96 + mode.size() + triggers.size();
-        const qsizetype needed =
-            document.size() + qsizetype(runs.size() * intervals.size()) * perRectangle;
-        if (needed > document.capacity())
-            document.reserve(std::max(needed, 2 * document.capacity()));
-        for (const auto &[left, right] : runs) {
-            const QString leftText = QString::number(left);
-            const QString rightText = QString::number(right);
-            for (const auto &[top, bottom] : intervals) {
-                document += bottomKey;
-                document += bottom;
-                document += leftKey;
-                document += leftText;
-                document += modeKey;
-                document += mode;
-                document += rightKey;
-                document += rightText;
-                document += topKey;
-                document += top;
-                document += triggers;
-                document += QLatin1String("},");
-            }
-        }
+        appendRectangles(
+            document, dayRuns(frame.value(TimecardKey::DayList).toMap().value(TimecardKey::Ele)),
+            intervals(frame.value(TimecardKey::Intervals).toMap().value(TimecardKey::Ele)), mode,
+            modeText == RecordingMode::Event ? ParseTriggerEvents(mapping) : QString());
     }
     if (document.endsWith(QLatin1Char(',')))
         document.chop(1);
@@ -158,10 +175,11 @@ QString PluginRecordingScheduleSettingSrv::ParseTriggerEvents(const QVariantMap 
     // card has its element: a server that does not know an analytic leaves
     // it out, and so does the document.
     const auto writeRows = [&](Triggers::Row::Kind kind) {
-        for (const Triggers::Row &row : Triggers::Rows) {
+        for (std::size_t i = 0; i < Triggers::Rows.size(); ++i) {
+            const Triggers::Row &row = Triggers::Rows[i];
             if (row.kind != kind)
                 continue;
-            const auto found = mapping.constFind(row.element);
+            const auto found = mapping.constFind(elementKeys()[i]);
             if (kind == Triggers::Row::OptionalFlag && found == mapping.constEnd())
                 continue;
             if (!triggers.endsWith(QLatin1Char('{')))
