@@ -32,8 +32,6 @@ inline const QString TimeCardID = QStringLiteral("TimeCardID");
 inline const QString ScheduleName = QStringLiteral("ScheduleName");
 inline const QString Revision = QStringLiteral("Revision");
 inline const QString CameraList = QStringLiteral("CameraList");
-inline const QString Name = QStringLiteral("Name");
-inline const QString GrpID = QStringLiteral("GrpID");
 inline const QString ScheduleAddCam = QStringLiteral("scheduleAddCam");
 inline const QString ScheduleRmvCam = QStringLiteral("scheduleRmvCam");
 inline const QString ScheduleID = QStringLiteral("scheduleID");
@@ -97,9 +95,8 @@ inline const QString DefaultContinuous = QStringLiteral("KOLT2 Default Continuou
 inline const QString DefaultEvent = QStringLiteral("KOLT2 Default Event Recording");
 } // namespace TimecardName
 
-// Recording modes that the templates use.
+// The recording mode that carries trigger elements.
 namespace RecordingMode {
-inline const QString Continuous = QStringLiteral("Continuous");
 inline const QString Event = QStringLiteral("Event");
 } // namespace RecordingMode
 

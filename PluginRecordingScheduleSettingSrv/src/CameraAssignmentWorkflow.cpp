@@ -6,6 +6,9 @@
 
 #include "PluginRecordingScheduleSettingSrv.h"
 
+#include "CameraList.h"
+#include "ClientInput.h"
+#include "FixedSchedule.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "TraceLog.h"
 
@@ -15,43 +18,57 @@ using namespace PluginRecordingScheduleSettingCommon;
 
 namespace {
 
-// Addition entries that stand for the fixed default time cards.
-const QString DefaultEventEntry = QStringLiteral("-2");
-const QString DefaultContinuousEntry = QStringLiteral("-3");
-
-QString TextOf(const QVariant &camera, const QString &key)
+// One entry of the payload's list under key, taken out, and the step
+// completion S that carries on through carryOn with what remains to do.
+struct Step
 {
-    return camera.toMap().value(key).toString();
+    QVariantMap entry;
+    ControlResultCallback done;
+};
+
+template <typename Plugin, typename CarryOn>
+std::optional<Step> takeStep(Plugin *plugin, CarryOn carryOn, const LifetimeGuard &guard,
+                             const QVariant &payload, const QString &key,
+                             const ResponseCallback &reply)
+{
+    QVariantMap remaining = payload.toMap();
+    QList<QVariant> entries = remaining.value(key).toList();
+    if (entries.isEmpty())
+        return std::nullopt;
+    const QVariantMap entry = entries.takeFirst().toMap();
+    remaining.insert(key, entries);
+    return Step{entry, guard.bind(reply, [plugin, carryOn, remaining, reply](bool ok, bool flag) {
+                    (plugin->*carryOn)(ok, flag, QVariant(remaining), reply);
+                })};
 }
 
-// Matched by name and group as text, whatever else the client's entry holds:
-// a group sent as the number 1 would otherwise never meet the server's "1",
-// and nothing would be removed. Every match goes, so that a camera that
-// stands twice stops recording by this time card.
-void RemoveCameras(QList<QVariant> &cameras, const QList<QVariant> &removal)
+// The read completion of one entry: the time card's cameras changed, then
+// written back with a time-out that grows with the cameras the server goes
+// through. Every failure ends the step through step(false, true).
+TimecardListCallback changeAfterRead(const LifetimeGuard &guard, const ResponseCallback &reply,
+                                     ControlResultCallback step, bool removing,
+                                     const QList<QVariant> &cameras)
 {
-    for (const QVariant &gone : removal) {
-        const QString name = TextOf(gone, PayloadKey::Name);
-        const QString group = TextOf(gone, PayloadKey::GrpID);
-        cameras.removeIf([&](const QVariant &camera) {
-            return TextOf(camera, PayloadKey::Name) == name &&
-                   TextOf(camera, PayloadKey::GrpID) == group;
-        });
-    }
-}
-
-// A camera whose name the time card already holds is not appended again:
-// standing twice, it would go on recording after one entry is removed.
-void AppendNewCameras(QList<QVariant> &cameras, const QList<QVariant> &additions)
-{
-    for (const QVariant &added : additions) {
-        const QString name = TextOf(added, PayloadKey::Name);
-        const bool held = std::any_of(cameras.cbegin(), cameras.cend(), [&](const QVariant &c) {
-            return TextOf(c, PayloadKey::Name) == name;
-        });
-        if (!held)
-            cameras.append(added);
-    }
+    // Runs only while the plug-in lives, so guard is still there.
+    return guard.bind(reply, [&guard, step, removing, cameras](bool ok, bool,
+                                                               const QList<QVariant> &timecards,
+                                                               const QString &answer) {
+        if (!ok || timecards.isEmpty())
+            return step(false, true);
+        CameraList changed = CameraList::onTimecard(timecards.first().toMap());
+        // Those it holds now for a removal, those it will hold for an addition.
+        const auto held = changed.entries().size();
+        if (removing)
+            changed.remove(cameras);
+        else
+            changed.merge(cameras);
+        const int timeoutMs =
+            Timeout::PerCamera * static_cast<int>(removing ? held : changed.entries().size());
+        const QSharedPointer<IRecordingSettingControl> control = guard.control();
+        if (!control ||
+            !control->UpdateTimecardCameraList(answer, changed.entries(), step, timeoutMs))
+            step(false, true);
+    });
 }
 
 } // namespace
@@ -59,7 +76,7 @@ void AppendNewCameras(QList<QVariant> &cameras, const QList<QVariant> &additions
 void PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingSchedule(const QVariant &payload,
                                                                             ResponseCallback reply)
 {
-    const VariantMap map = payload.toMap();
+    const QVariantMap map = payload.toMap();
     const QList<QVariant> removals = map.value(PayloadKey::ScheduleRmvCam).toList();
     const QList<QVariant> additions = map.value(PayloadKey::ScheduleAddCam).toList();
     if (removals.isEmpty() && additions.isEmpty()) {
@@ -71,12 +88,12 @@ void PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingSchedule(cons
     // card would otherwise fail the command after earlier entries had changed
     // the server, or read time card 0 and change whatever it holds.
     const auto namesTimecard = [](const QVariant &entry) {
-        int unused = 0;
-        return ReadTimecardId(entry.toMap().value(PayloadKey::ScheduleID).toString(), &unused);
+        return ClientInput::timecardId(entry.toMap().value(PayloadKey::ScheduleID).toString())
+            .has_value();
     };
     if (!std::all_of(removals.cbegin(), removals.cend(), namesTimecard) ||
         !std::all_of(additions.cbegin(), additions.cend(), namesTimecard)) {
-        ReplyFailure(reply);
+        replyFailure(reply);
         return;
     }
 
@@ -87,128 +104,62 @@ void PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingSchedule(cons
 bool PluginRecordingScheduleSettingSrv::RemoveCamerasFromSchedule(const QVariant &payload,
                                                                   ResponseCallback reply)
 {
-    VariantMap remaining = payload.toMap();
-    QList<QVariant> removals = remaining.value(PayloadKey::ScheduleRmvCam).toList();
-    if (removals.isEmpty())
+    const std::optional<Step> step = takeStep(
+        this, &PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingScheduleCallback,
+        m_lifetime, payload, PayloadKey::ScheduleRmvCam, reply);
+    if (!step)
         return false;
-    const VariantMap entry = removals.takeFirst().toMap();
-    remaining.insert(PayloadKey::ScheduleRmvCam, removals);
-
-    int timecardId = 0;
-    ReadTimecardId(entry.value(PayloadKey::ScheduleID).toString(), &timecardId);
-    const QList<QVariant> cameras = entry.value(PayloadKey::CamIDList).toList();
-
-    const QSharedPointer<IRecordingSettingControl> control = Control();
-    const bool sent =
-        control && control->GetScheduleTimecardInfoById(
-                       timecardId, ChangeCamerasAfterRead(true, cameras, remaining, reply));
-    if (!sent)
-        HandleUpdateCameraRecordingScheduleCallback(false, true, remaining, reply);
+    const int timecardId =
+        ClientInput::timecardId(step->entry.value(PayloadKey::ScheduleID).toString()).value_or(0);
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
+    if (!control ||
+        !control->GetScheduleTimecardInfoById(
+            timecardId, changeAfterRead(m_lifetime, reply, step->done, true,
+                                        step->entry.value(PayloadKey::CamIDList).toList())))
+        step->done(false, true);
     return true;
 }
 
 bool PluginRecordingScheduleSettingSrv::AddCamerasToSchedule(const QVariant &payload,
                                                              ResponseCallback reply)
 {
-    VariantMap remaining = payload.toMap();
-    QList<QVariant> additions = remaining.value(PayloadKey::ScheduleAddCam).toList();
-    if (additions.isEmpty())
+    const std::optional<Step> step = takeStep(
+        this, &PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingScheduleCallback,
+        m_lifetime, payload, PayloadKey::ScheduleAddCam, reply);
+    if (!step)
         return false;
-    const VariantMap entry = additions.takeFirst().toMap();
-    remaining.insert(PayloadKey::ScheduleAddCam, additions);
+    const QString timecardIdText = step->entry.value(PayloadKey::ScheduleID).toString();
+    const QList<QVariant> cameras = step->entry.value(PayloadKey::CamIDList).toList();
+    const FixedSchedule *fixed = FixedSchedule::byAdditionEntry(timecardIdText);
+    // A fixed time card is looked for first: creating it again would leave
+    // two time cards of the same fixed name on the server.
+    const auto addToFixed = [this, fixed, cameras, reply, done = step->done](
+                                bool ok, bool, const QList<QVariant> &timecards, const QString &) {
+        const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
+        if (!ok || !control)
+            return done(false, true);
+        const QVariantMap summary = fixed->summaryIn(*control, timecards);
+        const std::optional<int> timecardId =
+            ClientInput::timecardId(summary.value(TimecardKey::TmcardID).toString());
+        const bool sent =
+            summary.isEmpty()
+                ? fixed->put(*control, summary, QString(), cameras, done)
+                : timecardId &&
+                      control->GetScheduleTimecardInfoById(
+                          *timecardId, changeAfterRead(m_lifetime, reply, done, false, cameras));
+        if (!sent)
+            done(false, true);
+    };
 
-    const QString timecardIdText = entry.value(PayloadKey::ScheduleID).toString();
-    const QList<QVariant> cameras = entry.value(PayloadKey::CamIDList).toList();
-
-    const QSharedPointer<IRecordingSettingControl> control = Control();
-    bool sent = false;
-    if (control &&
-        (timecardIdText == DefaultEventEntry || timecardIdText == DefaultContinuousEntry)) {
-        // The fixed time card is looked for first: creating it again would
-        // leave two time cards of the same fixed name on the server.
-        const QString type = timecardIdText == DefaultEventEntry ? ScheduleTypeWord::Event
-                                                                 : ScheduleTypeWord::Continous;
-        sent = control->GetAllScheduleTimecardInfo(
-            Guard(reply, [this, type, cameras, remaining,
-                          reply](bool ok, bool, const QList<QVariant> &timecards, const QString &) {
-                AddCamerasToFixedTimecard(ok, timecards, type, cameras, remaining, reply);
-            }));
-    } else if (control) {
-        int timecardId = 0;
-        ReadTimecardId(timecardIdText, &timecardId);
-        sent = control->GetScheduleTimecardInfoById(
-            timecardId, ChangeCamerasAfterRead(false, cameras, remaining, reply));
-    }
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
+    const bool sent =
+        control && (fixed ? control->GetAllScheduleTimecardInfo(m_lifetime.bind(reply, addToFixed))
+                          : control->GetScheduleTimecardInfoById(
+                                ClientInput::timecardId(timecardIdText).value_or(0),
+                                changeAfterRead(m_lifetime, reply, step->done, false, cameras)));
     if (!sent)
-        HandleUpdateCameraRecordingScheduleCallback(false, true, remaining, reply);
+        step->done(false, true);
     return true;
-}
-
-void PluginRecordingScheduleSettingSrv::AddCamerasToFixedTimecard(
-    bool ok, const QList<QVariant> &timecards, const QString &type, const QList<QVariant> &cameras,
-    const VariantMap &remaining, ResponseCallback reply)
-{
-    const QSharedPointer<IRecordingSettingControl> control = Control();
-    if (!ok || !control) {
-        HandleUpdateCameraRecordingScheduleCallback(false, true, remaining, reply);
-        return;
-    }
-    const VariantMap summary = GetTimecardInfo(timecards, type);
-    bool sent = false;
-    if (summary.isEmpty()) {
-        QList<QVariant> created;
-        AppendNewCameras(created, cameras);
-        const ControlResultCallback done = CameraStepCompletion(remaining, reply);
-        sent = type == ScheduleTypeWord::Event
-                   ? control->CreateDefaultEventTimecard(created, done)
-                   : control->CreateDefaultContinuousTimecard(created, done);
-    } else {
-        int timecardId = 0;
-        sent = ReadTimecardId(summary.value(TimecardKey::TmcardID).toString(), &timecardId) &&
-               control->GetScheduleTimecardInfoById(
-                   timecardId, ChangeCamerasAfterRead(false, cameras, remaining, reply));
-    }
-    if (!sent)
-        HandleUpdateCameraRecordingScheduleCallback(false, true, remaining, reply);
-}
-
-TimecardListCallback PluginRecordingScheduleSettingSrv::ChangeCamerasAfterRead(
-    bool removing, const QList<QVariant> &cameras, const VariantMap &remaining,
-    const ResponseCallback &reply)
-{
-    return Guard(
-        reply, [this, removing, cameras, remaining,
-                reply](bool ok, bool, const QList<QVariant> &timecards, const QString &answer) {
-            if (!ok || timecards.isEmpty()) {
-                HandleUpdateCameraRecordingScheduleCallback(false, true, remaining, reply);
-                return;
-            }
-            QList<QVariant> changed = GetCameraList(timecards.first().toMap());
-            // The time-out grows with the cameras the server has to go through:
-            // those it holds now for a removal, those it will hold for an addition.
-            int timeoutMs = Timeout::PerCamera * static_cast<int>(changed.size());
-            if (removing) {
-                RemoveCameras(changed, cameras);
-            } else {
-                AppendNewCameras(changed, cameras);
-                timeoutMs = Timeout::PerCamera * static_cast<int>(changed.size());
-            }
-            const QSharedPointer<IRecordingSettingControl> control = Control();
-            const bool sent =
-                control && control->UpdateTimecardCameraList(
-                               answer, changed, CameraStepCompletion(remaining, reply), timeoutMs);
-            if (!sent)
-                HandleUpdateCameraRecordingScheduleCallback(false, true, remaining, reply);
-        });
-}
-
-ControlResultCallback
-PluginRecordingScheduleSettingSrv::CameraStepCompletion(const VariantMap &remaining,
-                                                        const ResponseCallback &reply)
-{
-    return Guard(reply, [this, remaining, reply](bool ok, bool flag) {
-        HandleUpdateCameraRecordingScheduleCallback(ok, flag, QVariant(remaining), reply);
-    });
 }
 
 void PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingScheduleCallback(
@@ -219,7 +170,7 @@ void PluginRecordingScheduleSettingSrv::HandleUpdateCameraRecordingScheduleCallb
         HdlrReqCallback(false, flag, reply);
         return;
     }
-    const VariantMap map = remaining.toMap();
+    const QVariantMap map = remaining.toMap();
     if (!map.value(PayloadKey::ScheduleRmvCam).toList().isEmpty() ||
         !map.value(PayloadKey::ScheduleAddCam).toList().isEmpty()) {
         HandleUpdateCameraRecordingSchedule(remaining, reply);

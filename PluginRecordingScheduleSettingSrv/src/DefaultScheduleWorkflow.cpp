@@ -6,21 +6,47 @@
 
 #include "PluginRecordingScheduleSettingSrv.h"
 
+#include "CameraList.h"
+#include "FixedSchedule.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "TraceLog.h"
-
-#include <QSet>
-
-#include <algorithm>
 
 using namespace PluginRecordingScheduleSettingCommon;
 
 namespace {
 
-bool IsFixedTimecardType(const QString &type)
+// The time cards other than the fixed one (its summary) that hold any of
+// the cameras, matched by name.
+QList<int> timecardsHoldingAny(const QList<QVariant> &timecards, const QList<QVariant> &cameras,
+                               const QVariantMap &fixedSummary)
 {
-    return type == ScheduleTypeWord::Continous || type == ScheduleTypeWord::Event ||
-           type == ScheduleTypeWord::Customize;
+    QSet<QString> names = CameraList(cameras).names();
+    names.remove(QString());
+    QList<int> holders;
+    if (names.isEmpty())
+        return holders;
+    for (const QVariant &entry : timecards) {
+        const QVariantMap timecard = entry.toMap();
+        const QString id = timecard.value(TimecardKey::TmcardID).toString();
+        if (fixedSummary.contains(TimecardKey::TmcardID) &&
+            id == fixedSummary.value(TimecardKey::TmcardID).toString())
+            continue;
+        if (CameraList::onTimecard(timecard).names().intersects(names))
+            holders.append(id.toInt());
+    }
+    return holders;
+}
+
+// The cameras onto the fixed time card, created when the server has none;
+// done answers the request, or the request is answered at once when the
+// control refuses to send.
+void putOnFixedTimecard(const QSharedPointer<IRecordingSettingControl> &control,
+                        const FixedSchedule *fixed, const QVariantMap &summary,
+                        const QString &content, const QList<QVariant> &cameras,
+                        const ResponseCallback &reply, ControlResultCallback done)
+{
+    if (!control || !fixed || !fixed->put(*control, summary, content, cameras, std::move(done)))
+        replyFailure(reply);
 }
 
 } // namespace
@@ -34,96 +60,34 @@ void PluginRecordingScheduleSettingSrv::UpdateTimecardCamList(
         HdlrReqCallback(false, flag, reply);
         return;
     }
-    if (!IsFixedTimecardType(type)) {
+    const FixedSchedule *fixed = FixedSchedule::byWord(type);
+    if (!fixed || !fixed->hasTimecard()) {
         TRACE_ERROR("%s, Invalid schedule recording type.",
                     "PluginRecordingScheduleSettingSrv::UpdateTimecardCamList");
         HdlrReqCallback(false, flag, reply);
         return;
     }
 
-    const VariantMap summary = GetTimecardInfo(timecards, type);
+    const QVariantMap summary = GetTimecardInfo(timecards, type);
     // Left on another time card, a camera would go on recording by it too,
     // and the queries would report its schedule as "other".
-    const QList<int> holders = TimecardIDThatHoldsAnyCamera(timecards, cameras, summary);
-    if (holders.isEmpty())
-        PutCamerasOnFixedTimecard(summary, type, content, cameras, reply);
-    else
-        RemoveCamerasFromTimecards(holders, type, content, cameras, reply);
-}
-
-QMap<QString, QVariant>
-PluginRecordingScheduleSettingSrv::GetTimecardInfo(const QList<QVariant> &timecards,
-                                                   const QString &type)
-{
-    const QSharedPointer<IRecordingSettingControl> control = Control();
-    if (!control)
-        return {};
-    if (type == ScheduleTypeWord::Continous)
-        return control->GetDefaultContinousTimecardInfo(timecards);
-    if (type == ScheduleTypeWord::Event)
-        return control->GetDefaultEventTimecardInfo(timecards);
-    if (type == ScheduleTypeWord::Customize)
-        return control->GetCustomizeTimecardInfo(timecards);
-    return {};
-}
-
-QList<int>
-PluginRecordingScheduleSettingSrv::TimecardIDThatHoldsAnyCamera(const QList<QVariant> &timecards,
-                                                                const QList<QVariant> &cameras,
-                                                                const VariantMap &except) const
-{
-    QSet<QString> names;
-    for (const QVariant &camera : cameras) {
-        const QString name = camera.toMap().value(PayloadKey::Name).toString();
-        if (!name.isEmpty())
-            names.insert(name);
-    }
-
-    QList<int> holders;
-    if (names.isEmpty())
-        return holders;
-    for (const QVariant &entry : timecards) {
-        const VariantMap timecard = entry.toMap();
-        const QString id = timecard.value(TimecardKey::TmcardID).toString();
-        if (except.contains(TimecardKey::TmcardID) &&
-            id == except.value(TimecardKey::TmcardID).toString())
-            continue;
-        const QList<QVariant> held = GetCameraList(timecard);
-        const bool holds = std::any_of(held.cbegin(), held.cend(), [&](const QVariant &camera) {
-            return names.contains(camera.toMap().value(TimecardKey::Name).toString());
-        });
-        if (holds)
-            holders.append(id.toInt());
-    }
-    return holders;
-}
-
-void PluginRecordingScheduleSettingSrv::PutCamerasOnFixedTimecard(const VariantMap &summary,
-                                                                  const QString &type,
-                                                                  const QString &content,
-                                                                  const QList<QVariant> &cameras,
-                                                                  ResponseCallback reply)
-{
-    const QSharedPointer<IRecordingSettingControl> control = Control();
-    if (!control) {
-        ReplyFailure(reply);
+    const QList<int> holders = timecardsHoldingAny(timecards, cameras, summary);
+    if (!holders.isEmpty()) {
+        HandleRemoveTimecardCamListRes(true, flag, type, content, cameras, holders, reply);
         return;
     }
-    const ControlResultCallback done = ReplyCompletion(reply);
-    const bool missing = summary.isEmpty();
-    bool sent = false;
-    if (type == ScheduleTypeWord::Continous) {
-        sent = missing ? control->CreateDefaultContinuousTimecard(cameras, done)
-                       : control->UpdateDefaultContinuousTimecard(summary, cameras, done);
-    } else if (type == ScheduleTypeWord::Event) {
-        sent = missing ? control->CreateDefaultEventTimecard(cameras, done)
-                       : control->UpdateDefaultEventTimecard(summary, cameras, done);
-    } else if (type == ScheduleTypeWord::Customize) {
-        sent = missing ? control->CreateCustomizeTimecard(content, cameras, done)
-                       : control->UpdateCustomizeTimecard(summary, content, cameras, done);
-    }
-    if (!sent)
-        ReplyFailure(reply);
+    putOnFixedTimecard(m_lifetime.control(), fixed, summary, content, cameras, reply,
+                       m_lifetime.bind(reply, [this, reply](bool ok, bool flag) {
+                           HdlrReqCallback(ok, flag, reply);
+                       }));
+}
+
+QVariantMap PluginRecordingScheduleSettingSrv::GetTimecardInfo(const QList<QVariant> &timecards,
+                                                               const QString &type)
+{
+    const FixedSchedule *fixed = FixedSchedule::byWord(type);
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
+    return fixed && control ? fixed->summaryIn(*control, timecards) : QVariantMap();
 }
 
 void PluginRecordingScheduleSettingSrv::HandleGetAllTimecardRes(
@@ -135,28 +99,8 @@ void PluginRecordingScheduleSettingSrv::HandleGetAllTimecardRes(
         HdlrReqCallback(false, flag, reply);
         return;
     }
-    RemoveCamerasFromTimecards(TimecardIDThatNeedsToRemoveCameraList(timecards), type, content,
-                               cameras, reply);
-}
-
-void PluginRecordingScheduleSettingSrv::RemoveCamerasFromTimecards(QList<int> timecardIds,
-                                                                   const QString &type,
-                                                                   const QString &content,
-                                                                   const QList<QVariant> &cameras,
-                                                                   ResponseCallback reply)
-{
-    const int timecardId = timecardIds.takeFirst();
-    const QSharedPointer<IRecordingSettingControl> control = Control();
-    const bool sent =
-        control &&
-        control->RemoveTimecardCameraList(
-            timecardId, cameras,
-            Guard(reply, [this, type, content, cameras, timecardIds, reply](bool ok, bool flag) {
-                HandleRemoveTimecardCamListRes(ok, flag, type, content, cameras, timecardIds,
-                                               reply);
-            }));
-    if (!sent)
-        ReplyFailure(reply);
+    HandleRemoveTimecardCamListRes(true, flag, type, content, cameras,
+                                   TimecardIDThatNeedsToRemoveCameraList(timecards), reply);
 }
 
 void PluginRecordingScheduleSettingSrv::HandleRemoveTimecardCamListRes(
@@ -168,11 +112,23 @@ void PluginRecordingScheduleSettingSrv::HandleRemoveTimecardCamListRes(
         HdlrReqCallback(false, flag, reply);
         return;
     }
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
     if (!timecardIds.isEmpty()) {
-        RemoveCamerasFromTimecards(std::move(timecardIds), type, content, cameras, reply);
+        const int timecardId = timecardIds.takeFirst();
+        const bool sent =
+            control && control->RemoveTimecardCameraList(
+                           timecardId, cameras,
+                           m_lifetime.bind(reply, [this, type, content, cameras, timecardIds,
+                                                   reply](bool ok, bool flag) {
+                               HandleRemoveTimecardCamListRes(ok, flag, type, content, cameras,
+                                                              timecardIds, reply);
+                           }));
+        if (!sent)
+            replyFailure(reply);
         return;
     }
-    if (type == ScheduleTypeWord::NotRecording) {
+    const FixedSchedule *fixed = FixedSchedule::byWord(type);
+    if (fixed && !fixed->hasTimecard()) {
         HdlrReqCallback(true, flag, reply);
         return;
     }
@@ -181,20 +137,19 @@ void PluginRecordingScheduleSettingSrv::HandleRemoveTimecardCamListRes(
     // is read afresh, since the removals changed the server. This second pass
     // removes nothing more, so two commands moving the same camera cannot
     // chase each other for ever.
-    const QSharedPointer<IRecordingSettingControl> control = Control();
-    const bool sent =
-        control &&
-        control->GetAllScheduleTimecardInfo(Guard(
-            reply, [this, type, content, cameras,
-                    reply](bool ok, bool flag, const QList<QVariant> &timecards, const QString &) {
-                if (!ok) {
-                    TRACE_ERROR("Fail to get time card list.");
-                    HdlrReqCallback(false, flag, reply);
-                    return;
-                }
-                PutCamerasOnFixedTimecard(GetTimecardInfo(timecards, type), type, content, cameras,
-                                          reply);
-            }));
-    if (!sent)
-        ReplyFailure(reply);
+    const auto put = [this, fixed, type, content, cameras, reply](
+                         bool ok, bool flag, const QList<QVariant> &timecards, const QString &) {
+        if (!ok) {
+            TRACE_ERROR("Fail to get time card list.");
+            HdlrReqCallback(false, flag, reply);
+            return;
+        }
+        putOnFixedTimecard(m_lifetime.control(), fixed, GetTimecardInfo(timecards, type), content,
+                           cameras, reply,
+                           m_lifetime.bind(reply, [this, reply](bool ok, bool flag) {
+                               HdlrReqCallback(ok, flag, reply);
+                           }));
+    };
+    if (!control || !control->GetAllScheduleTimecardInfo(m_lifetime.bind(reply, put)))
+        replyFailure(reply);
 }

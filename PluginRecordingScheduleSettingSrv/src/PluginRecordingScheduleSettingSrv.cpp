@@ -1,18 +1,12 @@
 #include "PluginRecordingScheduleSettingSrv.h"
 
 #include "IFrameworkTools.h"
-#include "RecordingScheduleSettingConstants.h"
 #include "RecordingSettingControl.h"
 #include "TraceLog.h"
 
 #include <new>
 
-using namespace PluginRecordingScheduleSettingCommon;
-
-PluginRecordingScheduleSettingSrv::PluginRecordingScheduleSettingSrv()
-    : m_lifetime(std::make_shared<PluginLifetime>())
-{
-}
+PluginRecordingScheduleSettingSrv::PluginRecordingScheduleSettingSrv() = default;
 
 PluginRecordingScheduleSettingSrv::~PluginRecordingScheduleSettingSrv()
 {
@@ -20,7 +14,7 @@ PluginRecordingScheduleSettingSrv::~PluginRecordingScheduleSettingSrv()
         TRACE_SCOPE("PluginRecordingScheduleSettingSrv::~PluginRecordingScheduleSettingSrv");
         // Waits for a completion that is running now; later ones answer on
         // their own without touching this object.
-        m_lifetime->end();
+        m_lifetime.end();
     }
     // The control is released after the Leave record, with the members.
 }
@@ -30,7 +24,8 @@ bool PluginRecordingScheduleSettingSrv::InitialPluginBase(IFrameworkTools *tools
     TRACE_SCOPE("PluginRecordingScheduleSettingSrv::InitialPluginBase");
     IKoltTunnelClient *tunnel = tools ? tools->GetTunnelClient() : nullptr;
     if (!tunnel) {
-        TRACE_ERROR("%s, Tunnel client get null.", "PluginRecordingScheduleSettingSrv::InitialPluginBase");
+        TRACE_ERROR("%s, Tunnel client get null.",
+                    "PluginRecordingScheduleSettingSrv::InitialPluginBase");
         return false;
     }
     QSharedPointer<IRecordingSettingControl> control;
@@ -48,13 +43,7 @@ bool PluginRecordingScheduleSettingSrv::InitialPluginBase(IFrameworkTools *tools
 void PluginRecordingScheduleSettingSrv::SetRecordingSettingControl(
     QSharedPointer<IRecordingSettingControl> control)
 {
-    QSharedPointer<IRecordingSettingControl> previous;
-    m_lifetime->runIfAlive([&] {
-        previous = std::move(m_control);
-        m_control = std::move(control);
-    });
-    // The previous control goes outside the lock; answers in flight keep it
-    // alive until they have been handled.
+    m_lifetime.setControl(std::move(control));
 }
 
 void PluginRecordingScheduleSettingSrv::RequestBlock(const QString &, const QVariant &,
@@ -65,8 +54,7 @@ void PluginRecordingScheduleSettingSrv::RequestBlock(const QString &, const QVar
 
 void PluginRecordingScheduleSettingSrv::SubscribeEventBlock(const QString &, const QString &,
                                                             const QVariant &,
-                                                            const RequestSenderInfo &,
-                                                            IResponser &)
+                                                            const RequestSenderInfo &, IResponser &)
 {
     TRACE_SCOPE("PluginRecordingScheduleSettingSrv::SubscribeEventBlock");
 }
@@ -75,53 +63,4 @@ void PluginRecordingScheduleSettingSrv::UnsubscribeEventBlock(const QString &, c
                                                               IResponser &)
 {
     TRACE_SCOPE("PluginRecordingScheduleSettingSrv::UnsubscribeEventBlock");
-}
-
-QSharedPointer<IRecordingSettingControl> PluginRecordingScheduleSettingSrv::Control()
-{
-    QSharedPointer<IRecordingSettingControl> control;
-    m_lifetime->runIfAlive([&] { control = m_control; });
-    return control;
-}
-
-void PluginRecordingScheduleSettingSrv::ReplyFailure(const ResponseCallback &reply)
-{
-    if (reply)
-        reply(true, ResultCode::Failure, QString(), QVariant());
-}
-
-namespace {
-
-// Wraps fn so that it runs only while the plug-in lives; a late call answers
-// the request itself, so that it still gets its one reply.
-template <typename... Values>
-std::function<void(Values...)> guarded(const std::shared_ptr<PluginLifetime> &lifetime,
-                                       const ResponseCallback &reply,
-                                       std::function<void(Values...)> fn)
-{
-    return [lifetime, reply, fn = std::move(fn)](Values... values) {
-        if (!lifetime->runIfAlive([&] { fn(values...); }) && reply)
-            reply(true, ResultCode::Failure, QString(), QVariant());
-    };
-}
-
-} // namespace
-
-ControlResultCallback PluginRecordingScheduleSettingSrv::Guard(
-    const ResponseCallback &reply, std::function<void(bool, bool)> fn) const
-{
-    return guarded(m_lifetime, reply, std::move(fn));
-}
-
-TimecardListCallback PluginRecordingScheduleSettingSrv::Guard(
-    const ResponseCallback &reply,
-    std::function<void(bool, bool, const QList<QVariant> &, const QString &)> fn) const
-{
-    return guarded(m_lifetime, reply, std::move(fn));
-}
-
-TimecardIdCallback PluginRecordingScheduleSettingSrv::Guard(
-    const ResponseCallback &reply, std::function<void(bool, bool, const QString &)> fn) const
-{
-    return guarded(m_lifetime, reply, std::move(fn));
 }

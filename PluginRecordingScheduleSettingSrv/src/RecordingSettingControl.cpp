@@ -1,6 +1,7 @@
 #include "RecordingSettingControl.h"
 
 #include "RecordingScheduleSettingConstants.h"
+#include "TimecardReadings.h"
 #include "TimecardTemplate.h"
 #include "TraceLog.h"
 
@@ -18,9 +19,30 @@ bool accepted(bool ok, const QString &responseCode)
     return ok && responseCode == ResultCode::Success;
 }
 
-bool readable(const QVariant &tree)
+// Whether the server accepted a request; otherwise the error record of the
+// answer handler named handler.
+bool acceptedOrLogged(bool ok, const QString &code, const char *handler)
 {
-    return tree.isValid() && !tree.isNull();
+    if (accepted(ok, code))
+        return true;
+    TRACE_ERROR("RecordingSettingControl::%s, %s failed: success:%d, reqRespCode:%s", handler,
+                handler, ok ? 1 : 0, code.toLocal8Bit().constData());
+    return false;
+}
+
+// The tree of an accepted answer; nothing, after the handler's error record,
+// for a refused request or content that does not parse.
+std::optional<QVariant> answerTree(const XML2Json &converter, bool ok, const QString &code,
+                                   const QString &content, const char *handler,
+                                   const char *unreadable)
+{
+    if (!acceptedOrLogged(ok, code, handler))
+        return std::nullopt;
+    QVariant tree = converter.parse(content);
+    if (tree.isValid() && !tree.isNull())
+        return tree;
+    TRACE_ERROR("RecordingSettingControl::%s, %s", handler, unreadable);
+    return std::nullopt;
 }
 
 } // namespace
@@ -125,23 +147,14 @@ void RecordingSettingControl::HdlrTunnelReqGetRecTimecard(bool ok, const QString
 {
     if (!done)
         return;
-    if (accepted(ok, responseCode)) {
-        const QVariant tree = m_converter.parse(content);
-        if (readable(tree)) {
-            const QVariant timecards =
-                tree.toMap().value(TimecardKey::GetRecTmcardRes).toMap().value(TimecardKey::Tmcard);
-            done(true, flag, TransContentAsList(timecards), content);
-            return;
-        }
-        TRACE_ERROR("%s, parse Get Recording Timecard failed.",
-                    "RecordingSettingControl::HdlrTunnelReqGetRecTimecard");
-        done(false, flag, {}, QString());
-        return;
-    }
-    TRACE_ERROR("%s, HdlrTunnelReqGetRecTimecard failed: success:%d, reqRespCode:%s",
-                "RecordingSettingControl::HdlrTunnelReqGetRecTimecard", ok ? 1 : 0,
-                responseCode.toLocal8Bit().constData());
-    done(false, flag, {}, QString());
+    const std::optional<QVariant> tree =
+        answerTree(m_converter, ok, responseCode, content, "HdlrTunnelReqGetRecTimecard",
+                   "parse Get Recording Timecard failed.");
+    if (!tree)
+        return done(false, flag, {}, QString());
+    const QVariant timecards =
+        tree->toMap().value(TimecardKey::GetRecTmcardRes).toMap().value(TimecardKey::Tmcard);
+    done(true, flag, TransContentAsList(timecards), content);
 }
 
 void RecordingSettingControl::HdlrAddScheduleCallback(bool ok, const QString &, const QString &,
@@ -151,49 +164,23 @@ void RecordingSettingControl::HdlrAddScheduleCallback(bool ok, const QString &, 
 {
     if (!done)
         return;
-    if (accepted(ok, responseCode)) {
-        const QVariant tree = m_converter.parse(content);
-        if (readable(tree)) {
-            done(true, flag,
-                 tree.toMap()
-                     .value(TimecardKey::InsRecTmcardRes)
-                     .toMap()
-                     .value(TimecardKey::TmcardID)
-                     .toString());
-            return;
-        }
-        TRACE_ERROR("%s, parse InsRecTmcardRes failed.",
-                    "RecordingSettingControl::HdlrAddScheduleCallback");
-        done(false, flag, QString());
-        return;
-    }
-    TRACE_ERROR("%s, HdlrAddScheduleCallback failed: success:%d, reqRespCode:%s",
-                "RecordingSettingControl::HdlrAddScheduleCallback", ok ? 1 : 0,
-                responseCode.toLocal8Bit().constData());
-    done(false, flag, QString());
+    const std::optional<QVariant> tree =
+        answerTree(m_converter, ok, responseCode, content, "HdlrAddScheduleCallback",
+                   "parse InsRecTmcardRes failed.");
+    // An answer without the identifier still counts as success.
+    const QVariant created = tree ? tree->toMap().value(TimecardKey::InsRecTmcardRes) : QVariant();
+    done(tree.has_value(), flag, created.toMap().value(TimecardKey::TmcardID).toString());
 }
 
 void RecordingSettingControl::HdlrTunnelReqCallback(bool ok, const QString &, const QString &,
                                                     const QString &responseCode, const QString &,
                                                     bool flag, ControlResultCallback done)
 {
-    if (!done)
-        return;
-    if (accepted(ok, responseCode)) {
-        done(true, flag);
-        return;
-    }
-    TRACE_ERROR("%s, HdlrTunnelReqCallback failed: success:%d, reqRespCode:%s",
-                "RecordingSettingControl::HdlrTunnelReqCallback", ok ? 1 : 0,
-                responseCode.toLocal8Bit().constData());
-    done(false, flag);
+    if (done)
+        done(acceptedOrLogged(ok, responseCode, "HdlrTunnelReqCallback"), flag);
 }
 
 QList<QVariant> RecordingSettingControl::TransContentAsList(const QVariant &content)
 {
-    if (!readable(content))
-        return {};
-    if (content.typeId() == QMetaType::QVariantList)
-        return content.toList();
-    return {content};
+    return TimecardReadings::asList(content);
 }

@@ -8,6 +8,7 @@
 #include <QSet>
 
 #include <atomic>
+
 #include <optional>
 
 // The server-facing half of the plug-in: composes the time card messages,
@@ -17,6 +18,8 @@
 // Each request in flight holds a strong reference to its control (when the
 // control is owned by a QSharedPointer), so a control that its owner replaces
 // or releases stays alive until every answer to it has been handled.
+struct FixedSchedule;
+
 class RecordingSettingControl final : public IRecordingSettingControl,
                                       public QEnableSharedFromThis<RecordingSettingControl>
 {
@@ -60,6 +63,7 @@ public:
     void SetClientID(void *const clientId) override;
 
 private:
+    // Benchmarks and fuzz targets reach the camera removal handler directly.
     friend class RecordingSettingControlTest;
 
     // Whose identity a send carries: the tunnel's own, or the last requester's.
@@ -99,13 +103,18 @@ private:
     QString ComposeIntervalMsg(double beginHours, double endHours) const;
     QString ComposeCamRecGrpListMsg(const QList<QVariant> &cameras) const;
 
-    // Sends a fixed time card: the summary's revision and identifier, its
-    // cameras merged after the given ones.
-    bool UpdateFixedTimecard(const QMap<QString, QVariant> &summary, const QString &name,
-                             const QString &mapping, const QList<QVariant> &cameras,
+    // The fixed time cards: the mapping is the fixed one, or composed from
+    // the client's document for the customised time card.
+    QString MappingOf(const FixedSchedule &fixed, const QString &content) const;
+    // Created with each camera once; the time-out grows with the cameras
+    // when perCamera is set.
+    bool InsertFixedTimecard(const FixedSchedule &fixed, const QString &content,
+                             const QList<QVariant> &cameras, bool perCamera,
                              ControlResultCallback done);
-    bool InsertFixedTimecard(const QString &name, const QString &mapping,
-                             const QList<QVariant> &cameras, int timeoutMs,
+    // Updated with the given cameras first, then the time card's own, each
+    // camera once.
+    bool UpdateFixedTimecard(const FixedSchedule &fixed, const QMap<QString, QVariant> &summary,
+                             const QString &content, const QList<QVariant> &cameras,
                              ControlResultCallback done);
     QMap<QString, QVariant> GetTimecardInfoByName(const QList<QVariant> &timecards,
                                                   const QString &name) const;

@@ -2,9 +2,12 @@
 
 #include "PluginRecordingScheduleSettingSrv.h"
 
+#include "ClientInput.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "RequestSenderInfo.h"
 #include "TraceLog.h"
+
+#include <utility>
 
 using namespace PluginRecordingScheduleSettingCommon;
 
@@ -13,77 +16,113 @@ void PluginRecordingScheduleSettingSrv::Request(const QString &command, const QV
                                                 ResponseCallback reply)
 {
     TRACE_SCOPE("PluginRecordingScheduleSettingSrv::Request");
-    const VariantMap map = payload.toMap();
+    using Self = PluginRecordingScheduleSettingSrv;
+    using Timecards = QList<QVariant>;
 
-    const QSharedPointer<IRecordingSettingControl> control = Control();
+    // One command's request as the rows below start it.
+    struct Call
+    {
+        Self &self;
+        const QVariant &payload;
+        const QVariantMap map;
+        const ResponseCallback &reply;
+        IRecordingSettingControl &control;
+
+        QString text(const QString &key) const { return map.value(key).toString(); }
+        QList<QVariant> cameras() const { return map.value(PayloadKey::CamRecGroupList).toList(); }
+
+        // The read of all time cards that most commands start with; refused,
+        // the request is answered at once, so the client is not left waiting.
+        void readAll(TimecardListCallback done) const
+        {
+            if (!control.GetAllScheduleTimecardInfo(self.m_lifetime.bind(reply, std::move(done))))
+                replyFailure(reply);
+        }
+        TimecardListCallback putOn(const QString &type, const QString &content) const
+        {
+            return [&self = self, type, content, cameras = cameras(), reply = reply](
+                       bool ok, bool flag, const Timecards &timecards, const QString &) {
+                self.UpdateTimecardCamList(ok, flag, timecards, type, content, cameras, reply);
+            };
+        }
+        TimecardListCallback takeOff() const
+        {
+            return [&self = self, cameras = cameras(), reply = reply](
+                       bool ok, bool flag, const Timecards &timecards, const QString &answer) {
+                self.HandleGetAllTimecardRes(ok, flag, timecards, answer,
+                                             ScheduleTypeWord::NotRecording, QString(), cameras,
+                                             reply);
+            };
+        }
+        using Query = void (Self::*)(bool, bool, const Timecards &, ResponseCallback);
+        TimecardListCallback answer(Query query) const
+        {
+            return [&self = self, query,
+                    reply = reply](bool ok, bool flag, const Timecards &timecards,
+                                   const QString &) { (self.*query)(ok, flag, timecards, reply); };
+        }
+        TimecardListCallback deleteOne(const QString &timecardId) const
+        {
+            return [&self = self, timecardId, reply = reply](
+                       bool ok, bool flag, const Timecards &timecards, const QString &) {
+                self.HandleDeleteSchedule(ok, flag, timecards, timecardId, reply);
+            };
+        }
+    };
+
+    // One row per command, compared in this order; the first that matches
+    // starts: the payload keys it reads, the read it starts and the
+    // completion of that read, or the handler it hands the request to.
+    using Start = void (*)(const Call &);
+    static const std::pair<const QString &, Start> routes[] = {
+        {Command::DefaultContinousSchedule,
+         [](const Call &c) { c.readAll(c.putOn(ScheduleTypeWord::Continous, QString())); }},
+        {Command::DefaultEventSchedule,
+         [](const Call &c) { c.readAll(c.putOn(ScheduleTypeWord::Event, QString())); }},
+        {Command::DefaultNotRecordingSchedule, [](const Call &c) { c.readAll(c.takeOff()); }},
+        {Command::CustomizeSchedule,
+         [](const Call &c) {
+             const QString content = c.text(PayloadKey::Timeframes);
+             // An unreadable document would wipe the customised time frames.
+             if (ClientInput::timeframes(content))
+                 c.readAll(c.putOn(ScheduleTypeWord::Customize, content));
+             else
+                 replyFailure(c.reply);
+         }},
+        {Command::GetScheduleRecInfo,
+         [](const Call &c) {
+             c.readAll(c.answer(&Self::ParseScheduleTimecardAndRequestCallback));
+         }},
+        {Command::GetCurrentScheduleInfo,
+         [](const Call &c) {
+             c.readAll(c.answer(&Self::ParseCurrentScheduleTimecardAndRequestCallback));
+         }},
+        {Command::AddSchedule, [](const Call &c) { c.self.HandleAddSchedule(c.payload, c.reply); }},
+        {Command::UpdateSchedule,
+         [](const Call &c) { c.self.HandleUpdateSchedule(c.payload, c.reply); }},
+        {Command::UpdateCamRecSchedule,
+         [](const Call &c) { c.self.HandleUpdateCameraRecordingSchedule(c.payload, c.reply); }},
+        {Command::GetAllScheduleRecInfo,
+         [](const Call &c) { c.self.getAllScheduleRecInfo(c.reply); }},
+        {Command::DelSchedule,
+         [](const Call &c) { c.readAll(c.deleteOne(c.text(PayloadKey::TimeCardID))); }},
+    };
+
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
     // Without a control nothing can be sent; the request is answered at once
     // instead of being dereferenced into a crash.
     if (!control) {
-        ReplyFailure(reply);
+        replyFailure(reply);
         return;
     }
     control->SetClientID(sender.clientId);
 
-    // Commands that start with a read of all time cards; a refused read is
-    // answered at once, so that the client is not left waiting.
-    const auto readAll = [&](TimecardListCallback done) {
-        if (!control->GetAllScheduleTimecardInfo(std::move(done)))
-            ReplyFailure(reply);
-    };
-    const auto assignDefault = [&](const QString &type, const QString &content) {
-        const QList<QVariant> cameras = map.value(PayloadKey::CamRecGroupList).toList();
-        readAll(Guard(reply, [this, type, content, cameras, reply](
-                                 bool ok, bool flag, const QList<QVariant> &timecards,
-                                 const QString &) {
-            UpdateTimecardCamList(ok, flag, timecards, type, content, cameras, reply);
-        }));
-    };
-
-    if (command == Command::DefaultContinousSchedule) {
-        assignDefault(ScheduleTypeWord::Continous, QString());
-    } else if (command == Command::DefaultEventSchedule) {
-        assignDefault(ScheduleTypeWord::Event, QString());
-    } else if (command == Command::DefaultNotRecordingSchedule) {
-        const QList<QVariant> cameras = map.value(PayloadKey::CamRecGroupList).toList();
-        readAll(Guard(reply, [this, cameras, reply](bool ok, bool flag,
-                                                    const QList<QVariant> &timecards,
-                                                    const QString &answer) {
-            HandleGetAllTimecardRes(ok, flag, timecards, answer, ScheduleTypeWord::NotRecording,
-                                    QString(), cameras, reply);
-        }));
-    } else if (command == Command::CustomizeSchedule) {
-        const QString content = map.value(PayloadKey::Timeframes).toString();
-        // An unreadable document would wipe the customised time frames.
-        if (TimeframesReadable(content))
-            assignDefault(ScheduleTypeWord::Customize, content);
-        else
-            ReplyFailure(reply);
-    } else if (command == Command::GetScheduleRecInfo) {
-        readAll(Guard(reply, [this, reply](bool ok, bool flag, const QList<QVariant> &timecards,
-                                           const QString &) {
-            ParseScheduleTimecardAndRequestCallback(ok, flag, timecards, reply);
-        }));
-    } else if (command == Command::GetCurrentScheduleInfo) {
-        readAll(Guard(reply, [this, reply](bool ok, bool flag, const QList<QVariant> &timecards,
-                                           const QString &) {
-            ParseCurrentScheduleTimecardAndRequestCallback(ok, flag, timecards, reply);
-        }));
-    } else if (command == Command::AddSchedule) {
-        HandleAddSchedule(payload, reply);
-    } else if (command == Command::UpdateSchedule) {
-        HandleUpdateSchedule(payload, reply);
-    } else if (command == Command::UpdateCamRecSchedule) {
-        HandleUpdateCameraRecordingSchedule(payload, reply);
-    } else if (command == Command::GetAllScheduleRecInfo) {
-        getAllScheduleRecInfo(reply);
-    } else if (command == Command::DelSchedule) {
-        const QString timecardId = map.value(PayloadKey::TimeCardID).toString();
-        readAll(Guard(reply, [this, timecardId, reply](bool ok, bool flag,
-                                                       const QList<QVariant> &timecards,
-                                                       const QString &) {
-            HandleDeleteSchedule(ok, flag, timecards, timecardId, reply);
-        }));
-    } else {
-        ReplyFailure(reply);
+    const Call call{*this, payload, payload.toMap(), reply, *control};
+    for (const auto &[name, start] : routes) {
+        if (command == name) {
+            start(call);
+            return;
+        }
     }
+    replyFailure(reply);
 }

@@ -9,14 +9,24 @@
 #include "TraceLog.h"
 
 using namespace PluginRecordingScheduleSettingCommon;
+using TimecardReadings::text;
 
 namespace {
 
-void replyFetchFailed(bool flag, const ResponseCallback &reply)
+// A query's one reply: the fetch's failure with its flag, or what answer()
+// makes of the time cards.
+template <typename Answer>
+void replyQuery(bool ok, bool flag, const ResponseCallback &reply, Answer answer)
 {
-    TRACE_ERROR("Fail to get all schedule time card.");
+    if (!ok) {
+        TRACE_ERROR("Fail to get all schedule time card.");
+        if (reply)
+            reply(flag, ResultCode::Failure, QString(), QVariant());
+        return;
+    }
+    const QVariant data = answer();
     if (reply)
-        reply(flag, ResultCode::Failure, QString(), QVariant());
+        reply(true, ResultCode::Success, QString(), data);
 }
 
 } // namespace
@@ -24,62 +34,49 @@ void replyFetchFailed(bool flag, const ResponseCallback &reply)
 void PluginRecordingScheduleSettingSrv::ParseScheduleTimecardAndRequestCallback(
     bool ok, bool flag, const QList<QVariant> &timecards, ResponseCallback reply)
 {
-    if (!ok) {
-        replyFetchFailed(flag, reply);
-        return;
-    }
-    const VariantMap summary = ParseScheduleTimecard(
-        timecards, TimecardIDThatHasCameraListExceptDefaultSchedule(timecards));
-    if (reply)
-        reply(true, ResultCode::Success, QString(), summary);
+    replyQuery(ok, flag, reply, [&] {
+        return ParseScheduleTimecard(timecards,
+                                     TimecardIDThatHasCameraListExceptDefaultSchedule(timecards));
+    });
 }
 
 void PluginRecordingScheduleSettingSrv::ParseCurrentScheduleTimecardAndRequestCallback(
     bool ok, bool flag, const QList<QVariant> &timecards, ResponseCallback reply)
 {
-    if (!ok) {
-        replyFetchFailed(flag, reply);
-        return;
-    }
-    const VariantMap summary =
-        ParseScheduleTimecard(timecards, TimecardIDThatHasCameraList(timecards));
-    if (reply)
-        reply(true, ResultCode::Success, QString(), summary);
+    replyQuery(ok, flag, reply, [&] {
+        return ParseScheduleTimecard(timecards, TimecardIDThatHasCameraList(timecards));
+    });
 }
 
 void PluginRecordingScheduleSettingSrv::ParseAllScheduleTimecardAndRequestCallback(
     bool ok, bool flag, const QList<QVariant> &timecards, ResponseCallback reply)
 {
-    using namespace TimecardReadings;
-    if (!ok) {
-        replyFetchFailed(flag, reply);
-        return;
-    }
-    QList<QVariant> schedules;
-    schedules.reserve(timecards.size());
-    for (const QVariant &entry : timecards) {
-        const VariantMap timecard = entry.toMap();
-        schedules.append(VariantMap{
-            {PayloadKey::ScheduleName, text(timecard.value(TimecardKey::Name))},
-            {PayloadKey::TimeCardID, text(timecard.value(TimecardKey::TmcardID))},
-            {PayloadKey::Revision, text(timecard.value(TimecardKey::Revision))},
-            {PayloadKey::CustomizeContent, GetCustomizeSchedule(timecard)},
-            {PayloadKey::CameraList, GetCameraList(timecard)},
-        });
-    }
-    if (reply)
-        reply(true, ResultCode::Success, QString(), schedules);
+    replyQuery(ok, flag, reply, [&] {
+        QList<QVariant> schedules;
+        schedules.reserve(timecards.size());
+        for (const QVariant &entry : timecards) {
+            const QVariantMap timecard = entry.toMap();
+            schedules.append(QVariantMap{
+                {PayloadKey::ScheduleName, text(timecard.value(TimecardKey::Name))},
+                {PayloadKey::TimeCardID, text(timecard.value(TimecardKey::TmcardID))},
+                {PayloadKey::Revision, text(timecard.value(TimecardKey::Revision))},
+                {PayloadKey::CustomizeContent, GetCustomizeSchedule(timecard)},
+                {PayloadKey::CameraList, GetCameraList(timecard)},
+            });
+        }
+        return schedules;
+    });
 }
 
 void PluginRecordingScheduleSettingSrv::getAllScheduleRecInfo(ResponseCallback reply)
 {
-    const QSharedPointer<IRecordingSettingControl> control = Control();
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
     // Refused or impossible read: answered at once, or the client would wait
     // for an answer that never comes.
-    if (!control || !control->GetAllScheduleTimecardInfo(Guard(
+    if (!control || !control->GetAllScheduleTimecardInfo(m_lifetime.bind(
                         reply, [this, reply](bool ok, bool flag, const QList<QVariant> &timecards,
                                              const QString &) {
                             ParseAllScheduleTimecardAndRequestCallback(ok, flag, timecards, reply);
                         })))
-        ReplyFailure(reply);
+        replyFailure(reply);
 }

@@ -4,14 +4,16 @@
 
 #include "PluginRecordingScheduleSettingSrv.h"
 
+#include "FixedSchedule.h"
 #include "RecordingScheduleSettingConstants.h"
-#include "RecordingScheduleType.h"
 #include "TimecardReadings.h"
+#include "TriggerTable.h"
 
 #include <QJsonArray>
 #include <QJsonDocument>
 
 #include <algorithm>
+#include <array>
 #include <utility>
 #include <vector>
 
@@ -20,60 +22,14 @@ using namespace TimecardReadings;
 
 namespace {
 
-struct TriggerKey
+// An element that may repeat, read as frames are: a missing or empty one
+// still counts as one entry, an empty map.
+QList<QVariant> atLeastOne(const QVariant &value)
 {
-    QLatin1String documentKey; // with its leading comma and trailing colon
-    QString element;
-};
-
-// Rows of the trigger event object that are always written, in order.
-const std::vector<TriggerKey> &alwaysWritten()
-{
-    static const std::vector<TriggerKey> keys{
-        {QLatin1String("\"motion\":"), QStringLiteral("Motion")},
-        {QLatin1String(",\"pir\":"), QStringLiteral("PIR")},
-        {QLatin1String(",\"tampering\":"), QStringLiteral("Tampering")},
-        {QLatin1String(",\"pptz\":"), QStringLiteral("PPTZTrigger")},
-        {QLatin1String(",\"lineDetection\":"), QStringLiteral("LineDetection")},
-        {QLatin1String(",\"fieldDetection\":"), QStringLiteral("FieldDetection")},
-        {QLatin1String(",\"loitering\":"), QStringLiteral("Loitering")},
-        {QLatin1String(",\"crowdDetection\":"), QStringLiteral("CrowdDetection")},
-        {QLatin1String(",\"missingObject\":"), QStringLiteral("MissingObject")},
-        {QLatin1String(",\"abandonObject\":"), QStringLiteral("AbandonObject")},
-        {QLatin1String(",\"faceDetection\":"), QStringLiteral("FaceDetection")},
-    };
-    return keys;
-}
-
-// Rows written only when the time card holds the element: servers that do
-// not know an analytic leave it out, and so does the document.
-const std::vector<TriggerKey> &writtenWhenPresent()
-{
-    static const std::vector<TriggerKey> keys{
-        {QLatin1String(",\"zoneDetection\":"), QStringLiteral("ZoneDetection")},
-        {QLatin1String(",\"smartTracking\":"), QStringLiteral("SmartTracking")},
-        {QLatin1String(",\"runningDetection\":"), QStringLiteral("RunningDetection")},
-        {QLatin1String(",\"parkingViolationDetection\":"),
-         QStringLiteral("ParkingViolationDetection")},
-        {QLatin1String(",\"restrictedZoneDetection\":"), QStringLiteral("RestrictedZoneDetection")},
-        {QLatin1String(",\"temperatureThresholdWarning\":"),
-         QStringLiteral("TemperatureThresholdWarning")},
-        {QLatin1String(",\"temperatureThresholdAlarm\":"),
-         QStringLiteral("TemperatureThresholdAlarm")},
-        {QLatin1String(",\"temperatureDifferenceWarning\":"),
-         QStringLiteral("TemperatureDifferenceWarning")},
-        {QLatin1String(",\"temperatureDifferenceAlarm\":"),
-         QStringLiteral("TemperatureDifferenceAlarm")},
-        {QLatin1String(",\"temperatureRiseWarning\":"), QStringLiteral("TemperatureRiseWarning")},
-        {QLatin1String(",\"temperatureRiseAlarm\":"), QStringLiteral("TemperatureRiseAlarm")},
-        {QLatin1String(",\"temperatureSectionAlarm\":"), QStringLiteral("TemperatureSectionAlarm")},
-        {QLatin1String(",\"thermalIntrusion\":"), QStringLiteral("ThermalIntrusion")},
-        {QLatin1String(",\"thermalMultiLoitering\":"), QStringLiteral("ThermalMultiLoitering")},
-        {QLatin1String(",\"fireSpotDetection\":"), QStringLiteral("FireSpotDetection")},
-        {QLatin1String(",\"smokerDetection\":"), QStringLiteral("SmokerDetection")},
-        {QLatin1String(",\"smokeAndFlameDetection\":"), QStringLiteral("SmokeAndFlameDetection")},
-    };
-    return keys;
+    QList<QVariant> list = asList(value);
+    if (list.isEmpty())
+        list.append(QVariant());
+    return list;
 }
 
 QLatin1String boolText(bool value)
@@ -114,7 +70,7 @@ QString quotedMode(const QString &mode)
 std::vector<std::pair<qint64, qint64>> dayRuns(const QVariant &days)
 {
     std::vector<std::pair<qint64, qint64>> runs;
-    for (const QVariant &entry : entries(days)) {
+    for (const QVariant &entry : atLeastOne(days)) {
         const qint64 day = dayNumber(entry.toMap().value(TimecardKey::AttrBegin));
         if (!runs.empty() && day == runs.back().second + 1)
             runs.back().second = day;
@@ -124,67 +80,83 @@ std::vector<std::pair<qint64, qint64>> dayRuns(const QVariant &days)
     return runs;
 }
 
+// The trigger elements as keys of a time card's map, made once: a document
+// of many event frames would otherwise make them again for every frame.
+const std::array<QString, Triggers::Rows.size()> &elementKeys()
+{
+    static const auto keys = [] {
+        std::array<QString, Triggers::Rows.size()> made;
+        for (std::size_t i = 0; i < made.size(); ++i)
+            made[i] = Triggers::Rows[i].element;
+        return made;
+    }();
+    return keys;
+}
+
+// The (Top, Bottom) texts of a frame's intervals, in hours.
+std::vector<std::pair<QString, QString>> intervals(const QVariant &entries)
+{
+    std::vector<std::pair<QString, QString>> texts;
+    for (const QVariant &interval : atLeastOne(entries)) {
+        const QVariantMap bounds = interval.toMap();
+        texts.emplace_back(hoursText(number(bounds.value(TimecardKey::AttrBegin))),
+                           hoursText(number(bounds.value(TimecardKey::AttrEnd))));
+    }
+    return texts;
+}
+
+// One rectangle per day run and interval, each followed by a comma. Appended
+// in place and grown ahead, doubling: a document of many event frames runs
+// to tens of megabytes, and growing it rectangle by rectangle spends the
+// time copying it.
+void appendRectangles(QString &document, const std::vector<std::pair<qint64, qint64>> &runs,
+                      const std::vector<std::pair<QString, QString>> &intervals,
+                      const QString &mode, const QString &triggers)
+{
+    const qsizetype perRectangle = 96 + mode.size() + triggers.size();
+    const qsizetype needed =
+        document.size() + qsizetype(runs.size() * intervals.size()) * perRectangle;
+    if (needed > document.capacity())
+        document.reserve(std::max(needed, 2 * document.capacity()));
+    for (const auto &[left, right] : runs) {
+        const QString leftText = QString::number(left);
+        const QString rightText = QString::number(right);
+        for (const auto &[top, bottom] : intervals) {
+            document += QLatin1String("{\"Bottom\":");
+            document += bottom;
+            document += QLatin1String(",\"Left\":");
+            document += leftText;
+            document += QLatin1String(",\"RecordingMode\":");
+            document += mode;
+            document += QLatin1String(",\"Right\":");
+            document += rightText;
+            document += QLatin1String(",\"Top\":");
+            document += top;
+            document += triggers;
+            document += QLatin1String("},");
+        }
+    }
+}
+
 } // namespace
 
 QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &mappings) const
 {
-    static const QLatin1String bottomKey("{\"Bottom\":");
-    static const QLatin1String leftKey(",\"Left\":");
-    static const QLatin1String modeKey(",\"RecordingMode\":");
-    static const QLatin1String rightKey(",\"Right\":");
-    static const QLatin1String topKey(",\"Top\":");
-
     QString document = QStringLiteral("{\"Rectangles\":[");
     for (const QVariant &entry : mappings) {
-        const VariantMap mapping = entry.toMap();
+        const QVariantMap mapping = entry.toMap();
         const QString modeText = text(mapping.value(TimecardKey::RecMode));
         const QString mode = quotedMode(modeText);
-        const VariantMap frame = mapping.value(TimecardKey::Frame).toMap();
-
+        const QVariantMap frame = mapping.value(TimecardKey::Frame).toMap();
         if (text(frame.value(TimecardKey::RepeatMod)) != TimecardKey::Weekly) {
             document += QLatin1String("{\"Bottom\":-1,\"Left\":-1,\"RecordingMode\":") + mode +
                         QLatin1String(",\"Right\":-1,\"Top\":-1},");
             continue;
         }
-
-        const auto runs =
-            dayRuns(frame.value(TimecardKey::DayList).toMap().value(TimecardKey::Ele));
-        std::vector<std::pair<QString, QString>> intervals; // (Top, Bottom) texts
-        for (const QVariant &interval :
-             entries(frame.value(TimecardKey::Intervals).toMap().value(TimecardKey::Ele))) {
-            const VariantMap bounds = interval.toMap();
-            intervals.emplace_back(hoursText(number(bounds.value(TimecardKey::AttrBegin))),
-                                   hoursText(number(bounds.value(TimecardKey::AttrEnd))));
-        }
-        const QString triggers =
-            modeText == RecordingMode::Event ? ParseTriggerEvents(mapping) : QString();
-
-        // Grown ahead, doubling: a document of many event frames runs to tens
-        // of megabytes, and growing it rectangle by rectangle spends the time
-        // copying it.
-        const qsizetype perRectangle = 96 + mode.size() + triggers.size();
-        const qsizetype needed =
-            document.size() + qsizetype(runs.size() * intervals.size()) * perRectangle;
-        if (needed > document.capacity())
-            document.reserve(std::max(needed, 2 * document.capacity()));
-        for (const auto &[left, right] : runs) {
-            const QString leftText = QString::number(left);
-            const QString rightText = QString::number(right);
-            for (const auto &[top, bottom] : intervals) {
-                document += bottomKey;
-                document += bottom;
-                document += leftKey;
-                document += leftText;
-                document += modeKey;
-                document += mode;
-                document += rightKey;
-                document += rightText;
-                document += topKey;
-                document += top;
-                document += triggers;
-                document += QLatin1String("},");
-            }
-        }
+        appendRectangles(
+            document, dayRuns(frame.value(TimecardKey::DayList).toMap().value(TimecardKey::Ele)),
+            intervals(frame.value(TimecardKey::Intervals).toMap().value(TimecardKey::Ele)), mode,
+            modeText == RecordingMode::Event ? ParseTriggerEvents(mapping) : QString());
     }
     if (document.endsWith(QLatin1Char(',')))
         document.chop(1);
@@ -192,31 +164,38 @@ QString PluginRecordingScheduleSettingSrv::ParseSchedule(const QList<QVariant> &
     return document;
 }
 
-QString PluginRecordingScheduleSettingSrv::ParseTriggerEvents(const VariantMap &mapping) const
+QString PluginRecordingScheduleSettingSrv::ParseTriggerEvents(const QVariantMap &mapping) const
 {
     const int digitalInput = integer(mapping.value(TimecardKey::DigiInput));
     const bool falling = flag(mapping.value(TimecardKey::StopUntilDIFalling));
     const bool rising = flag(mapping.value(TimecardKey::StopUntilDIRising));
 
     QString triggers = QStringLiteral(",\"triggerEvents\":{");
-    for (const TriggerKey &key : alwaysWritten()) {
-        triggers += key.documentKey;
-        triggers += boolText(flag(mapping.value(key.element)));
-    }
-    for (const TriggerKey &key : writtenWhenPresent()) {
-        const auto found = mapping.constFind(key.element);
-        if (found == mapping.constEnd())
-            continue;
-        triggers += key.documentKey;
-        triggers += boolText(flag(*found));
-    }
+    // The rows of one kind in table order; an optional one only when the time
+    // card has its element: a server that does not know an analytic leaves
+    // it out, and so does the document.
+    const auto writeRows = [&](Triggers::Row::Kind kind) {
+        for (std::size_t i = 0; i < Triggers::Rows.size(); ++i) {
+            const Triggers::Row &row = Triggers::Rows[i];
+            if (row.kind != kind)
+                continue;
+            const auto found = mapping.constFind(elementKeys()[i]);
+            if (kind == Triggers::Row::OptionalFlag && found == mapping.constEnd())
+                continue;
+            if (!triggers.endsWith(QLatin1Char('{')))
+                triggers += QLatin1Char(',');
+            triggers += QLatin1Char('"');
+            triggers += row.key;
+            triggers += QLatin1String("\":");
+            triggers += boolText(found != mapping.constEnd() && flag(*found));
+        }
+    };
+    writeRows(Triggers::Row::Flag);
+    writeRows(Triggers::Row::OptionalFlag);
     triggers += QLatin1String(",\"di\":");
     triggers += boolText(digitalInput >= 1 || falling || rising);
     triggers += ParseDITraditionalRec(digitalInput);
-    triggers += QLatin1String(",\"activatedToNormal\":");
-    triggers += boolText(falling);
-    triggers += QLatin1String(",\"normalToActivated\":");
-    triggers += boolText(rising);
+    writeRows(Triggers::Row::StopFlag);
     triggers += QLatin1Char('}');
     return triggers;
 }
@@ -228,13 +207,13 @@ QString PluginRecordingScheduleSettingSrv::ParseDITraditionalRec(int mode) const
            QLatin1String(",\"recordingStateNormal\":") + boolText(mode == 2 || mode == 3);
 }
 
-QString PluginRecordingScheduleSettingSrv::GetCustomizeSchedule(const VariantMap &timecard) const
+QString PluginRecordingScheduleSettingSrv::GetCustomizeSchedule(const QVariantMap &timecard) const
 {
     return ParseSchedule(
-        entries(timecard.value(TimecardKey::Mapping).toMap().value(TimecardKey::Ele)));
+        atLeastOne(timecard.value(TimecardKey::Mapping).toMap().value(TimecardKey::Ele)));
 }
 
-PluginRecordingScheduleSettingSrv::VariantMap
+QVariantMap
 PluginRecordingScheduleSettingSrv::ParseScheduleTimecard(const QList<QVariant> &timecards,
                                                          const QList<int> &timecardIds) const
 {
@@ -245,17 +224,14 @@ PluginRecordingScheduleSettingSrv::ParseScheduleTimecard(const QList<QVariant> &
     } else if (timecardIds.size() == 1) {
         const int wanted = timecardIds.constFirst();
         for (const QVariant &entry : timecards) {
-            const VariantMap timecard = entry.toMap();
+            const QVariantMap timecard = entry.toMap();
             if (integer(timecard.value(TimecardKey::TmcardID)) != wanted)
                 continue;
-            const QString name = text(timecard.value(TimecardKey::Name));
-            if (name == TimecardName::Customize) {
-                type = Customized;
-                content = GetCustomizeSchedule(timecard);
-            } else if (name == TimecardName::DefaultContinuous) {
-                type = DefaultContinuous;
-            } else if (name == TimecardName::DefaultEvent) {
-                type = DefaultEvent;
+            if (const FixedSchedule *fixed =
+                    FixedSchedule::byTimecardName(text(timecard.value(TimecardKey::Name)))) {
+                type = fixed->inForce;
+                if (type == Customized)
+                    content = GetCustomizeSchedule(timecard);
             }
             break;
         }

@@ -4,61 +4,27 @@
 
 #include "PluginRecordingScheduleSettingSrv.h"
 
+#include "ClientInput.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "TraceLog.h"
 
-#include <QJsonDocument>
-
 using namespace PluginRecordingScheduleSettingCommon;
-
-bool PluginRecordingScheduleSettingSrv::ReadTimecardId(const QString &text, int *timecardId)
-{
-    const int first = text.startsWith(QLatin1Char('-')) ? 1 : 0;
-    if (text.size() == first)
-        return false;
-    for (int i = first; i < text.size(); ++i) {
-        const char16_t c = text.at(i).unicode();
-        if (c < u'0' || c > u'9')
-            return false;
-    }
-    bool inRange = false;
-    const int value = text.toInt(&inRange, 10);
-    if (!inRange)
-        return false;
-    *timecardId = value;
-    return true;
-}
-
-bool PluginRecordingScheduleSettingSrv::TimeframesReadable(const QString &content)
-{
-    if (QJsonDocument::fromJson(content.toUtf8()).isObject())
-        return true;
-    TRACE_ERROR("Time frames parse error. %s", content.toLocal8Bit().constData());
-    return false;
-}
-
-ControlResultCallback
-PluginRecordingScheduleSettingSrv::ReplyCompletion(const ResponseCallback &reply)
-{
-    return Guard(reply, [this, reply](bool ok, bool flag) { HdlrReqCallback(ok, flag, reply); });
-}
 
 void PluginRecordingScheduleSettingSrv::HandleAddSchedule(const QVariant &payload,
                                                           ResponseCallback reply)
 {
-    const VariantMap map = payload.toMap();
-    const QString name = map.value(PayloadKey::ScheduleName).toString();
-    const QString content = map.value(PayloadKey::Timeframes).toString();
-
-    const QSharedPointer<IRecordingSettingControl> control = Control();
+    const QVariantMap map = payload.toMap();
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
     const bool sent =
-        control && control->AddSchedule(
-                       name, content,
-                       Guard(reply, [this, reply](bool ok, bool flag, const QString &timecardId) {
-                           HdlrAddScheduleCallback(ok, flag, timecardId, reply);
-                       }));
+        control &&
+        control->AddSchedule(
+            map.value(PayloadKey::ScheduleName).toString(),
+            map.value(PayloadKey::Timeframes).toString(),
+            m_lifetime.bind(reply, [this, reply](bool ok, bool flag, const QString &timecardId) {
+                HdlrAddScheduleCallback(ok, flag, timecardId, reply);
+            }));
     if (!sent)
-        ReplyFailure(reply);
+        replyFailure(reply);
 }
 
 void PluginRecordingScheduleSettingSrv::HdlrAddScheduleCallback(bool ok, bool flag,
@@ -73,44 +39,39 @@ void PluginRecordingScheduleSettingSrv::HdlrAddScheduleCallback(bool ok, bool fl
 void PluginRecordingScheduleSettingSrv::HandleUpdateSchedule(const QVariant &payload,
                                                              ResponseCallback reply)
 {
-    const VariantMap map = payload.toMap();
+    const QVariantMap map = payload.toMap();
     const QString timecardIdText = map.value(PayloadKey::TimeCardID).toString();
-    const QString name = map.value(PayloadKey::ScheduleName).toString();
     const QString content = map.value(PayloadKey::Timeframes).toString();
-    const QList<QVariant> cameras = map.value(PayloadKey::CamRecGroupList).toList();
-
     // A text that is no number would read time card 0 and update whatever the
     // server keeps there; an unreadable document would wipe the time frames.
-    int timecardId = 0;
-    if (!ReadTimecardId(timecardIdText, &timecardId) || !TimeframesReadable(content)) {
-        ReplyFailure(reply);
+    const std::optional<int> timecardId = ClientInput::timecardId(timecardIdText);
+    if (!timecardId || !ClientInput::timeframes(content)) {
+        replyFailure(reply);
         return;
     }
 
-    const QSharedPointer<IRecordingSettingControl> control = Control();
-    const bool sent =
-        control &&
-        control->GetScheduleTimecardInfoById(
-            timecardId,
-            Guard(reply, [this, timecardIdText, name, content, cameras,
-                          reply](bool ok, bool, const QList<QVariant> &timecards, const QString &) {
-                if (!ok || timecards.isEmpty()) {
-                    ReplyFailure(reply);
-                    return;
-                }
-                // The update carries the revision just read, so that the server
-                // can refuse it when the time card has changed since.
-                const QString revision =
-                    timecards.first().toMap().value(TimecardKey::Revision).toString();
-                const QSharedPointer<IRecordingSettingControl> control = Control();
-                const bool sent =
-                    control && control->UpdateSchedule(revision, timecardIdText, name, content,
-                                                       cameras, ReplyCompletion(reply));
-                if (!sent)
-                    ReplyFailure(reply);
-            }));
-    if (!sent)
-        ReplyFailure(reply);
+    // The update carries the revision just read, so that the server can
+    // refuse it when the time card has changed since. The camera list goes as
+    // the client sent it: it states the whole list the time card is to hold.
+    const auto update = [this, timecardIdText, content, reply,
+                         name = map.value(PayloadKey::ScheduleName).toString(),
+                         cameras = map.value(PayloadKey::CamRecGroupList).toList()](
+                            bool ok, bool, const QList<QVariant> &timecards, const QString &) {
+        const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
+        const bool sent =
+            ok && !timecards.isEmpty() && control &&
+            control->UpdateSchedule(
+                timecards.first().toMap().value(TimecardKey::Revision).toString(), timecardIdText,
+                name, content, cameras, m_lifetime.bind(reply, [this, reply](bool ok, bool flag) {
+                    HdlrReqCallback(ok, flag, reply);
+                }));
+        if (!sent)
+            replyFailure(reply);
+    };
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
+    if (!control ||
+        !control->GetScheduleTimecardInfoById(*timecardId, m_lifetime.bind(reply, update)))
+        replyFailure(reply);
 }
 
 void PluginRecordingScheduleSettingSrv::HandleDeleteSchedule(bool ok, bool flag,
@@ -125,9 +86,9 @@ void PluginRecordingScheduleSettingSrv::HandleDeleteSchedule(bool ok, bool flag,
     }
 
     // Identifiers are compared as the client wrote them: "07" is not time card 7.
-    VariantMap timecard;
+    QVariantMap timecard;
     for (const QVariant &entry : timecards) {
-        const VariantMap map = entry.toMap();
+        const QVariantMap map = entry.toMap();
         if (map.value(TimecardKey::TmcardID).toString() == timecardId) {
             timecard.insert(TimecardKey::Revision, map.value(TimecardKey::Revision));
             timecard.insert(TimecardKey::TmcardID, QVariant(timecardId));
@@ -135,11 +96,14 @@ void PluginRecordingScheduleSettingSrv::HandleDeleteSchedule(bool ok, bool flag,
         }
     }
 
-    const QSharedPointer<IRecordingSettingControl> control = Control();
+    const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
     const bool sent =
-        !timecard.isEmpty() && control && control->DeleteSchedule(timecard, ReplyCompletion(reply));
+        !timecard.isEmpty() && control &&
+        control->DeleteSchedule(timecard, m_lifetime.bind(reply, [this, reply](bool ok, bool flag) {
+            HdlrReqCallback(ok, flag, reply);
+        }));
     if (!sent)
-        ReplyFailure(reply);
+        replyFailure(reply);
 }
 
 void PluginRecordingScheduleSettingSrv::HdlrReqCallback(bool ok, bool flag, ResponseCallback reply)

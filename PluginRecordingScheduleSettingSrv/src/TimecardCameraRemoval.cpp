@@ -3,6 +3,7 @@
 // mapping and revision go back exactly as the server sent them.
 #include "RecordingSettingControl.h"
 
+#include "CameraList.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "TimecardAnswerText.h"
 #include "TimecardTemplate.h"
@@ -15,15 +16,6 @@ using namespace PluginRecordingScheduleSettingCommon;
 namespace {
 
 const QString RecGrpID = QStringLiteral("RecGrpID");
-
-QSet<QString> namesOf(const QList<QVariant> &cameras)
-{
-    QSet<QString> names;
-    names.reserve(cameras.size());
-    for (const QVariant &camera : cameras)
-        names.insert(camera.toMap().value(TimecardKey::Name).toString());
-    return names;
-}
 
 } // namespace
 
@@ -65,7 +57,7 @@ void RecordingSettingControl::HdlrRmvDefTimecardCameraList(bool ok, bool flag,
         // Never an update that silently empties the list: a camera list that
         // cannot be read leaves the time card as it is.
         const std::optional<QString> kept =
-            RemoveCamera(timecard->mid(place.start, place.length), namesOf(removal));
+            RemoveCamera(timecard->mid(place.start, place.length), CameraList(removal).names());
         if (!kept)
             return fail();
         timecard->replace(place.start, place.length, *kept);

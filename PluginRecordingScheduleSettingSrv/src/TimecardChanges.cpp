@@ -2,6 +2,8 @@
 // lookups of the plug-in's own time cards by their fixed names.
 #include "RecordingSettingControl.h"
 
+#include "CameraList.h"
+#include "FixedSchedule.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "TimecardAnswerText.h"
 #include "TimecardTemplate.h"
@@ -11,46 +13,6 @@
 using namespace PluginRecordingScheduleSettingCommon;
 using TimecardTemplate::escaped;
 using TimecardTemplate::filled;
-
-namespace {
-
-// A camera list as the converter may give it: a list, or one lone camera.
-QList<QVariant> cameraEntries(const QVariant &cameras)
-{
-    if (cameras.typeId() == QMetaType::QVariantList)
-        return cameras.toList();
-    if (cameras.typeId() == QMetaType::QVariantMap)
-        return {cameras};
-    return {};
-}
-
-QString cameraName(const QVariant &camera)
-{
-    return camera.toMap().value(TimecardKey::Name).toString();
-}
-
-// The given cameras first, then the time card's own. Merged by name: a
-// camera kept twice would go on recording by this time card after one copy
-// is removed.
-QList<QVariant> mergedCameras(const QList<QVariant> &given, const QList<QVariant> &present)
-{
-    QList<QVariant> merged;
-    merged.reserve(given.size() + present.size());
-    QSet<QString> names;
-    names.reserve(given.size() + present.size());
-    for (const QList<QVariant> *list : {&given, &present}) {
-        for (const QVariant &camera : *list) {
-            const QString name = cameraName(camera);
-            if (names.contains(name))
-                continue;
-            names.insert(name);
-            merged.append(camera);
-        }
-    }
-    return merged;
-}
-
-} // namespace
 
 bool RecordingSettingControl::AddSchedule(const QString &name, const QString &content,
                                           TimecardIdCallback done)
@@ -63,13 +25,21 @@ bool RecordingSettingControl::AddSchedule(const QString &name, const QString &co
                 BindTimecardId(std::move(done)));
 }
 
-bool RecordingSettingControl::InsertFixedTimecard(const QString &name, const QString &mapping,
-                                                  const QList<QVariant> &cameras, int timeoutMs,
+bool RecordingSettingControl::InsertFixedTimecard(const FixedSchedule &fixed,
+                                                  const QString &content,
+                                                  const QList<QVariant> &cameras, bool perCamera,
                                                   ControlResultCallback done)
 {
+    if (!m_tunnel)
+        return false;
+    // Each camera once: a client's list that names one twice would otherwise
+    // stand twice on the new time card.
+    const QList<QVariant> held = CameraList().merge(cameras).entries();
     const QString body =
-        filled(Template::InsertTimecard, {name, mapping, ComposeCamRecGrpListMsg(cameras)});
-    return Send(TunnelCommand::InsRecTmcard, body, timeoutMs, Identity::Tunnel,
+        filled(Template::InsertTimecard,
+               {fixed.timecardName, MappingOf(fixed, content), ComposeCamRecGrpListMsg(held)});
+    return Send(TunnelCommand::InsRecTmcard, body,
+                perCamera ? CameraTimeout(held.size()) : Timeout::Minimum, Identity::Tunnel,
                 BindResult(std::move(done)));
 }
 
@@ -77,24 +47,21 @@ bool RecordingSettingControl::CreateCustomizeTimecard(const QString &content,
                                                       const QList<QVariant> &cameras,
                                                       ControlResultCallback done)
 {
-    if (!m_tunnel)
-        return false;
-    return InsertFixedTimecard(TimecardName::Customize, ComposeScheRecTimeframeMsg(content),
-                               cameras, Timeout::Minimum, std::move(done));
+    return InsertFixedTimecard(FixedSchedule::customize(), content, cameras, false,
+                               std::move(done));
 }
 
 bool RecordingSettingControl::CreateDefaultContinuousTimecard(const QList<QVariant> &cameras,
                                                               ControlResultCallback done)
 {
-    return InsertFixedTimecard(TimecardName::DefaultContinuous, Template::DefaultContinuousMapping,
-                               cameras, CameraTimeout(cameras.size()), std::move(done));
+    return InsertFixedTimecard(FixedSchedule::continuous(), QString(), cameras, true,
+                               std::move(done));
 }
 
 bool RecordingSettingControl::CreateDefaultEventTimecard(const QList<QVariant> &cameras,
                                                          ControlResultCallback done)
 {
-    return InsertFixedTimecard(TimecardName::DefaultEvent, Template::DefaultEventMapping, cameras,
-                               CameraTimeout(cameras.size()), std::move(done));
+    return InsertFixedTimecard(FixedSchedule::event(), QString(), cameras, true, std::move(done));
 }
 
 bool RecordingSettingControl::UpdateSchedule(const QString &revision, const QString &timecardId,
@@ -112,17 +79,29 @@ bool RecordingSettingControl::UpdateSchedule(const QString &revision, const QStr
                 Identity::Requester, BindResult(std::move(done)));
 }
 
-bool RecordingSettingControl::UpdateFixedTimecard(const QMap<QString, QVariant> &summary,
-                                                  const QString &name, const QString &mapping,
+QString RecordingSettingControl::MappingOf(const FixedSchedule &fixed, const QString &content) const
+{
+    return fixed.mapping.isEmpty() ? ComposeScheRecTimeframeMsg(content) : fixed.mapping;
+}
+
+bool RecordingSettingControl::UpdateFixedTimecard(const FixedSchedule &fixed,
+                                                  const QMap<QString, QVariant> &summary,
+                                                  const QString &content,
                                                   const QList<QVariant> &cameras,
                                                   ControlResultCallback done)
 {
+    if (!m_tunnel)
+        return false;
     const QList<QVariant> merged =
-        mergedCameras(cameras, cameraEntries(summary.value(TimecardKey::CamList)));
+        CameraList()
+            .merge(cameras)
+            .merge(TransContentAsList(summary.value(TimecardKey::CamList)))
+            .entries();
     const QString body =
-        filled(Template::UpdateTimecard, {escaped(summary.value(TimecardKey::Revision).toString()),
-                                          escaped(summary.value(TimecardKey::TmcardID).toString()),
-                                          name, mapping, ComposeCamRecGrpListMsg(merged)});
+        filled(Template::UpdateTimecard,
+               {escaped(summary.value(TimecardKey::Revision).toString()),
+                escaped(summary.value(TimecardKey::TmcardID).toString()), fixed.timecardName,
+                MappingOf(fixed, content), ComposeCamRecGrpListMsg(merged)});
     return Send(TunnelCommand::UpdRecTmcard, body, Timeout::Minimum, Identity::Tunnel,
                 BindResult(std::move(done)));
 }
@@ -132,26 +111,24 @@ bool RecordingSettingControl::UpdateCustomizeTimecard(const QMap<QString, QVaria
                                                       const QList<QVariant> &cameras,
                                                       ControlResultCallback done)
 {
-    if (!m_tunnel)
-        return false;
-    return UpdateFixedTimecard(summary, TimecardName::Customize,
-                               ComposeScheRecTimeframeMsg(content), cameras, std::move(done));
+    return UpdateFixedTimecard(FixedSchedule::customize(), summary, content, cameras,
+                               std::move(done));
 }
 
 bool RecordingSettingControl::UpdateDefaultContinuousTimecard(
     const QMap<QString, QVariant> &summary, const QList<QVariant> &cameras,
     ControlResultCallback done)
 {
-    return UpdateFixedTimecard(summary, TimecardName::DefaultContinuous,
-                               Template::DefaultContinuousMapping, cameras, std::move(done));
+    return UpdateFixedTimecard(FixedSchedule::continuous(), summary, QString(), cameras,
+                               std::move(done));
 }
 
 bool RecordingSettingControl::UpdateDefaultEventTimecard(const QMap<QString, QVariant> &summary,
                                                          const QList<QVariant> &cameras,
                                                          ControlResultCallback done)
 {
-    return UpdateFixedTimecard(summary, TimecardName::DefaultEvent, Template::DefaultEventMapping,
-                               cameras, std::move(done));
+    return UpdateFixedTimecard(FixedSchedule::event(), summary, QString(), cameras,
+                               std::move(done));
 }
 
 bool RecordingSettingControl::DeleteSchedule(const QMap<QString, QVariant> &timecard,
@@ -216,17 +193,17 @@ RecordingSettingControl::GetTimecardInfoByName(const QList<QVariant> &timecards,
 QMap<QString, QVariant>
 RecordingSettingControl::GetDefaultContinousTimecardInfo(const QList<QVariant> &timecards)
 {
-    return GetTimecardInfoByName(timecards, TimecardName::DefaultContinuous);
+    return GetTimecardInfoByName(timecards, FixedSchedule::continuous().timecardName);
 }
 
 QMap<QString, QVariant>
 RecordingSettingControl::GetDefaultEventTimecardInfo(const QList<QVariant> &timecards)
 {
-    return GetTimecardInfoByName(timecards, TimecardName::DefaultEvent);
+    return GetTimecardInfoByName(timecards, FixedSchedule::event().timecardName);
 }
 
 QMap<QString, QVariant>
 RecordingSettingControl::GetCustomizeTimecardInfo(const QList<QVariant> &timecards)
 {
-    return GetTimecardInfoByName(timecards, TimecardName::Customize);
+    return GetTimecardInfoByName(timecards, FixedSchedule::customize().timecardName);
 }

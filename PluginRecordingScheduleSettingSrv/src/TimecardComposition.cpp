@@ -3,12 +3,13 @@
 // element. Pure text work on the caller's thread; nothing is sent from here.
 #include "RecordingSettingControl.h"
 
+#include "ClientInput.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "TimecardTemplate.h"
 #include "TraceLog.h"
+#include "TriggerTable.h"
 
 #include <QJsonArray>
-#include <QJsonDocument>
 #include <QJsonObject>
 #include <QXmlStreamWriter>
 
@@ -19,53 +20,6 @@
 using namespace PluginRecordingScheduleSettingCommon;
 
 namespace {
-
-// The trigger elements of a composed event time frame in the order the
-// server expects them, with the key of the document's trigger event object
-// that each reflects. "ContMotNum" and "DigiInput" are not plain flags.
-struct TriggerElement
-{
-    QLatin1String element;
-    QLatin1String key;
-};
-
-const QLatin1String ContMotNum("ContMotNum");
-const QLatin1String DigiInput("DigiInput");
-
-const TriggerElement TriggerElements[] = {
-    {QLatin1String("Motion"), QLatin1String("motion")},
-    {ContMotNum, QLatin1String()},
-    {DigiInput, QLatin1String()},
-    {QLatin1String("PIR"), QLatin1String("pir")},
-    {QLatin1String("Tampering"), QLatin1String("tampering")},
-    {QLatin1String("PPTZTrigger"), QLatin1String("pptz")},
-    {QLatin1String("StopUntilDIFalling"), QLatin1String("activatedToNormal")},
-    {QLatin1String("StopUntilDIRising"), QLatin1String("normalToActivated")},
-    {QLatin1String("LineDetection"), QLatin1String("lineDetection")},
-    {QLatin1String("FieldDetection"), QLatin1String("fieldDetection")},
-    {QLatin1String("Loitering"), QLatin1String("loitering")},
-    {QLatin1String("CrowdDetection"), QLatin1String("crowdDetection")},
-    {QLatin1String("MissingObject"), QLatin1String("missingObject")},
-    {QLatin1String("AbandonObject"), QLatin1String("abandonObject")},
-    {QLatin1String("FaceDetection"), QLatin1String("faceDetection")},
-    {QLatin1String("ZoneDetection"), QLatin1String("zoneDetection")},
-    {QLatin1String("SmartTracking"), QLatin1String("smartTracking")},
-    {QLatin1String("RunningDetection"), QLatin1String("runningDetection")},
-    {QLatin1String("ParkingViolationDetection"), QLatin1String("parkingViolationDetection")},
-    {QLatin1String("RestrictedZoneDetection"), QLatin1String("restrictedZoneDetection")},
-    {QLatin1String("TemperatureThresholdWarning"), QLatin1String("temperatureThresholdWarning")},
-    {QLatin1String("TemperatureThresholdAlarm"), QLatin1String("temperatureThresholdAlarm")},
-    {QLatin1String("TemperatureDifferenceWarning"), QLatin1String("temperatureDifferenceWarning")},
-    {QLatin1String("TemperatureDifferenceAlarm"), QLatin1String("temperatureDifferenceAlarm")},
-    {QLatin1String("TemperatureRiseWarning"), QLatin1String("temperatureRiseWarning")},
-    {QLatin1String("TemperatureRiseAlarm"), QLatin1String("temperatureRiseAlarm")},
-    {QLatin1String("TemperatureSectionAlarm"), QLatin1String("temperatureSectionAlarm")},
-    {QLatin1String("ThermalIntrusion"), QLatin1String("thermalIntrusion")},
-    {QLatin1String("ThermalMultiLoitering"), QLatin1String("thermalMultiLoitering")},
-    {QLatin1String("FireSpotDetection"), QLatin1String("fireSpotDetection")},
-    {QLatin1String("SmokerDetection"), QLatin1String("smokerDetection")},
-    {QLatin1String("SmokeAndFlameDetection"), QLatin1String("smokeAndFlameDetection")},
-};
 
 const QString DigitalInputKey = QStringLiteral("di");
 const QString TraditionalKey = QStringLiteral("traditional");
@@ -114,12 +68,10 @@ double numberOf(const QJsonValue &value)
 
 QString RecordingSettingControl::ComposeScheRecTimeframeMsg(const QString &content) const
 {
-    const QJsonDocument document = QJsonDocument::fromJson(content.toUtf8());
-    if (document.isNull() || !document.isObject()) {
-        TRACE_ERROR("Time frames parse error. %s", content.toLocal8Bit().constData());
+    const std::optional<QJsonObject> document = ClientInput::timeframes(content);
+    if (!document)
         return {};
-    }
-    const QJsonValue rectangles = document.object().value(DocKey::Rectangles);
+    const QJsonValue rectangles = document->value(DocKey::Rectangles);
     if (!rectangles.isArray())
         return {};
 
@@ -167,15 +119,19 @@ RecordingSettingControl::ComposeTriggerEventsMsg(const QMap<QString, QVariant> &
     QString text;
     QXmlStreamWriter writer(&text);
     writer.setAutoFormatting(false);
-    for (const TriggerElement &row : TriggerElements) {
-        if (row.element == ContMotNum)
+    for (const Triggers::Row &row : Triggers::Rows) {
+        switch (row.kind) {
+        case Triggers::Row::MotionCount:
             writer.writeTextElement(row.element, QStringLiteral("1"));
-        else if (row.element == DigiInput)
+            break;
+        case Triggers::Row::DigitalInput:
             writer.writeTextElement(row.element, GetDITraditionalRecMode(triggers));
-        else
+            break;
+        default:
             writer.writeTextElement(row.element, triggers.value(row.key).toBool()
                                                      ? QStringLiteral("1")
                                                      : QStringLiteral("0"));
+        }
     }
     return text;
 }

@@ -3,6 +3,7 @@
 
 #include "PluginRecordingScheduleSettingSrv.h"
 
+#include "CameraList.h"
 #include "RecordingScheduleSettingConstants.h"
 #include "TimecardReadings.h"
 
@@ -20,7 +21,7 @@ QList<int> timecardsWithCameras(const QList<QVariant> &timecards, Keep keep)
 {
     QList<int> ids;
     for (const QVariant &entry : timecards) {
-        const QMap<QString, QVariant> timecard = entry.toMap();
+        const QVariantMap timecard = entry.toMap();
         if (!timecard.contains(TimecardKey::CamList))
             continue;
         const int id = integer(timecard.value(TimecardKey::TmcardID));
@@ -51,12 +52,7 @@ QList<int> PluginRecordingScheduleSettingSrv::TimecardIDThatNeedsToRemoveCameraL
     return ids.isEmpty() ? QList<int>{DefaultTimecardId} : ids;
 }
 
-QList<QVariant> PluginRecordingScheduleSettingSrv::GetCameraList(const VariantMap &timecard) const
+QList<QVariant> PluginRecordingScheduleSettingSrv::GetCameraList(const QVariantMap &timecard) const
 {
-    const QVariant cameras = timecard.value(TimecardKey::CamList).toMap().value(TimecardKey::Cam);
-    QList<QVariant> all = entries(cameras);
-    // A lone "Cam" with nothing in it is no camera.
-    if (all.size() == 1 && !isList(cameras) && all.constFirst().toMap().isEmpty())
-        return {};
-    return all;
+    return CameraList::onTimecard(timecard).entries();
 }

@@ -13,14 +13,13 @@ bool isList(const QVariant &value)
     return type == QMetaType::QVariantList || type == QMetaType::QStringList;
 }
 
-QList<QVariant> entries(const QVariant &value)
+QList<QVariant> asList(const QVariant &value)
 {
-    if (isList(value)) {
-        QList<QVariant> list = value.toList();
-        if (!list.isEmpty())
-            return list;
-    }
-    return {QVariant(value.toMap())};
+    if (!value.isValid() || value.isNull())
+        return {};
+    if (isList(value))
+        return value.toList();
+    return {value};
 }
 
 QString text(const QVariant &value)

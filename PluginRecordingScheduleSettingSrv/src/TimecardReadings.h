@@ -14,10 +14,9 @@ namespace TimecardReadings {
 // Whether the converter made a list of the value (a tag that repeats).
 bool isList(const QVariant &value);
 
-// The entries of an element that may repeat: the list when there are
-// several, otherwise the value read as one map, taken as the only entry even
-// when it is empty.
-QList<QVariant> entries(const QVariant &value);
+// An element that may repeat, as a list: the list when the tag repeats, no
+// entry for a missing value, otherwise the lone value as the only entry.
+QList<QVariant> asList(const QVariant &value);
 
 QString text(const QVariant &value);
 // 0 for a text that is no number, and for one that reads as infinite or NaN:
