@@ -65,8 +65,8 @@ INSTANTIATE_TEST_SUITE_P(
                    "GetRecTmcard(all), GetRecTmcard(4), UpdRecTmcard(4)",
                    "#4 KOLT2 Default Event Recording {event week} [C_1/1 C_5/1] | #6 Other", false,
                    "0"},
-        CommandRow{"-3 creates the default continuous time card when missing", "#6 Other",
-                   "UpdateCamRecSchedule", move({}, {entry("-3", "C_5/1")}),
+        CommandRow{"-3 creates the default continuous time card when missing, each camera once",
+                   "#6 Other", "UpdateCamRecSchedule", move({}, {entry("-3", "C_5/1 C_5/1")}),
                    "GetRecTmcard(all), InsRecTmcard",
                    "#6 Other | #7 " + Continuous + " {continuous week} [C_5/1]", false, "0"}),
     rowName<CommandRow>);
@@ -79,6 +79,12 @@ INSTANTIATE_TEST_SUITE_P(
                    "GetRecTmcard(all), InsRecTmcard",
                    "#1 Default Schedule {continuous week} | #2 " + Continuous +
                        " {continuous week} [C_1/1 C_2/1]",
+                   false, "0"},
+        CommandRow{"camera named twice stands once on a new fixed time card", "",
+                   "DefaultEventSchedule", group("C_20/1 C_21/1 C_20/1"),
+                   "GetRecTmcard(all), InsRecTmcard",
+                   "#1 Default Schedule {continuous week} | #2 KOLT2 Default Event Recording "
+                   "{event week} [C_20/1 C_21/1]",
                    false, "0"},
         CommandRow{"existing fixed time card gets the cameras before its own",
                    "#2 " + Continuous + " [C_3/1]", "DefaultContinousSchedule",
