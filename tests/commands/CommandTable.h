@@ -7,6 +7,7 @@
 // and cameras (name/group); mapping and cameras left out when there are none.
 
 #include "LivePlugin.h"
+#include "RowName.h"
 
 #include <gtest/gtest.h>
 
@@ -26,14 +27,6 @@ struct CommandRow
 inline void PrintTo(const CommandRow &row, std::ostream *os)
 {
     *os << row.name;
-}
-// Row names as test names: letters and digits, the rest "_".
-template <typename Row> std::string rowName(const ::testing::TestParamInfo<Row> &info)
-{
-    std::string name = info.param.name;
-    for (char &c : name)
-        c = std::isalnum(static_cast<unsigned char>(c)) ? c : '_';
-    return name;
 }
 
 // A "GetRecTmcardRes" text holding the time cards written compactly.

@@ -6,13 +6,13 @@
 #include "LocalFrameworkTools.h"
 #include "PluginRecordingScheduleSettingSrv.h"
 #include "QtPrinters.h"
-#include "ReplyRecorder.h"
+#include "ReplyCollector.h"
 #include "RequestSenderInfo.h"
 #include "TestTunnel.h"
 
 #include <gtest/gtest.h>
 
-#include <deque>
+#include <cstdint>
 #include <memory>
 #include <thread>
 
@@ -134,7 +134,7 @@ struct Site
         tunnel.setResponder(serverAnswer);
         EXPECT_TRUE(plugin->InitialPluginBase(&tools));
     }
-    ReplyRecorder reply;
+    ReplyCollector replies;
     TestTunnel tunnel;
     LocalFrameworkTools tools{&tunnel};
     std::unique_ptr<PluginRecordingScheduleSettingSrv> plugin =
@@ -199,7 +199,7 @@ TEST_P(Walk, EndsInOneReplyAndSendsNothingAfterTheFailedStep)
     site.tunnel.setResponder([&, n = size_t(0)](const TestTunnel::Sent &sent) mutable {
         return n++ == row.step && answerFails ? failed(row.fault) : serverAnswer(sent);
     });
-    site.plugin->Request(row.chain.command, row.chain.payload, {}, site.reply.callback());
+    site.plugin->Request(row.chain.command, row.chain.payload, {}, site.replies.replyFunction(1));
     for (size_t i = 0; site.tunnel.pending() > 0; ++i) {
         if (row.fault == Fault::PluginGone && i == row.step)
             site.plugin.reset();
@@ -214,10 +214,11 @@ TEST_P(Walk, EndsInOneReplyAndSendsNothingAfterTheFailedStep)
     for (size_t i = 0; i < sent; ++i)
         expected << exchanges[i].command;
     EXPECT_EQ(site.tunnel.commands(), expected);
-    ASSERT_EQ(site.reply.count(), 1);
-    EXPECT_EQ(site.reply.last().code, row.fault == Fault::None ? u"0"_s : u"-1"_s);
+    ASSERT_EQ(site.replies.replyCount(1), 1);
+    const ReplyCollector::Reply reply = *site.replies.waitForFirst(1, {});
+    EXPECT_EQ(reply.code, row.fault == Fault::None ? u"0"_s : u"-1"_s);
     if (row.fault != Fault::None) {
-        EXPECT_EQ(site.reply.last().flag, !(refuse && exchanges[row.step].afterControlRead));
+        EXPECT_EQ(reply.flag, !(refuse && exchanges[row.step].afterControlRead));
     }
 }
 
@@ -256,16 +257,18 @@ TEST_P(Concurrent, EveryRequestGetsExactlyOneReply)
     std::vector<std::unique_ptr<Site>> sites;
     for (int p = 0; p < Plugins; ++p)
         sites.push_back(std::make_unique<Site>(TestTunnel::Delivery::OtherThread));
-    std::deque<ReplyRecorder> replies(Requesters * each);
+    ReplyCollector replies;
     std::vector<std::thread> requesters;
     for (int r = 0; r < Requesters; ++r) {
         requesters.emplace_back([&, r] {
             for (size_t i = 0; i < each; ++i) {
                 const Chain &chain = Chains[i % Chains.size()];
-                ReplyRecorder &reply = replies[r * each + i];
-                sites[r % Plugins]->plugin->Request(chain.command, chain.payload,
-                                                    RequestSenderInfo{&reply, {}, {}},
-                                                    reply.callback());
+                // Each request its own requester: the control's identity keeps changing.
+                const int n = int(r * each + i);
+                sites[r % Plugins]->plugin->Request(
+                    chain.command, chain.payload,
+                    RequestSenderInfo{reinterpret_cast<void *>(std::uintptr_t(n) + 1), {}, {}},
+                    replies.replyFunction(n));
             }
         });
     }
@@ -280,14 +283,14 @@ TEST_P(Concurrent, EveryRequestGetsExactlyOneReply)
             site->plugin.reset();
     }
 
-    for (const ReplyRecorder &reply : replies)
-        ASSERT_TRUE(reply.waitFor(1, std::chrono::seconds(120)));
+    for (size_t n = 0; n < Requesters * each; ++n)
+        ASSERT_TRUE(replies.waitForFirst(int(n), std::chrono::seconds(120)));
     for (const auto &site : sites)
         site->tunnel.waitIdle();
-    for (size_t n = 0; n < replies.size(); ++n) {
+    for (size_t n = 0; n < Requesters * each; ++n) {
         const char *const chain = Chains[n % each % Chains.size()].name;
-        ASSERT_EQ(replies[n].count(), 1) << chain;
-        const QString code = replies[n].last().code;
+        ASSERT_EQ(replies.replyCount(int(n)), 1) << chain;
+        const QString code = replies.waitForFirst(int(n), {})->code;
         if (GetParam() != Meanwhile::DeletePlugins || code != u"-1") {
             EXPECT_EQ(code, u"0"_s) << chain;
         }

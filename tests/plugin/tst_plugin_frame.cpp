@@ -6,7 +6,7 @@
 #include "IResponser.h"
 #include "LocalFrameworkTools.h"
 #include "QtPrinters.h"
-#include "ReplyRecorder.h"
+#include "ReplyCollector.h"
 #include "RequestSenderInfo.h"
 #include "TestTunnel.h"
 
@@ -75,7 +75,7 @@ protected:
     TestTunnel tunnel;
     LocalFrameworkTools tools{&tunnel};
     LocalFrameworkTools noTunnel{nullptr};
-    ReplyRecorder reply;
+    ReplyCollector replies;
 };
 
 TEST_F(Frame, LoadsAsTheHostLoadsIt)
@@ -115,7 +115,7 @@ TEST_P(EntryPoints, TraceAndLeaveTheTunnelInUse)
         EXPECT_EQ(initialise(call), call == Tunnel);
     }
     if (call == Request)
-        p->Request(u"Unknown"_s, QVariant(), RequestSenderInfo{}, reply.callback());
+        p->Request(u"Unknown"_s, QVariant(), RequestSenderInfo{}, replies.replyFunction(1));
     if (call == Block)
         p->RequestBlock(u"GetScheduleRecInfo"_s, QVariant(), RequestSenderInfo{}, responser);
     if (call == Subscribe)
@@ -126,7 +126,8 @@ TEST_P(EntryPoints, TraceAndLeaveTheTunnelInUse)
         delete p;
     EXPECT_EQ(records(), GetParam().records);
     EXPECT_EQ(responser.calls, 0);
-    plugin()->Request(u"GetScheduleRecInfo"_s, QVariant(), RequestSenderInfo{}, reply.callback());
+    plugin()->Request(u"GetScheduleRecInfo"_s, QVariant(), RequestSenderInfo{},
+                      replies.replyFunction(2));
     EXPECT_EQ(tunnel.commands(), GetParam().sentByAQueryAfter);
 }
 
@@ -177,12 +178,13 @@ TEST_P(AnsweredAtOnce, WithTrueMinusOneAndNothingSent)
     if (GetParam().initialisation != Nothing)
         initialise(GetParam().initialisation);
     plugin()->Request(GetParam().command, QVariantMap{{u"TimeCardID"_s, u"5"_s}},
-                      RequestSenderInfo{}, reply.callback());
-    ASSERT_EQ(reply.count(), 1);
-    EXPECT_TRUE(reply.last().flag);
-    EXPECT_EQ(reply.last().code, u"-1"_s);
-    EXPECT_EQ(reply.last().text, QString());
-    EXPECT_FALSE(reply.last().data.isValid());
+                      RequestSenderInfo{}, replies.replyFunction(1));
+    ASSERT_EQ(replies.replyCount(1), 1);
+    const ReplyCollector::Reply reply = *replies.waitForFirst(1, {});
+    EXPECT_TRUE(reply.flag);
+    EXPECT_EQ(reply.code, u"-1"_s);
+    EXPECT_EQ(reply.text, QString());
+    EXPECT_FALSE(reply.data.isValid());
     EXPECT_TRUE(tunnel.sent().isEmpty());
 }
 

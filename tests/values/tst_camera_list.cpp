@@ -1,11 +1,10 @@
 // A time card's camera list: what merging a client's cameras into it and
 // taking cameras off it leave on the time card.
 #include "CameraList.h"
+#include "RowName.h"
 
 #include <QStringList>
 #include <gtest/gtest.h>
-
-#include <cctype>
 
 namespace {
 
@@ -42,6 +41,11 @@ struct Row
     const char *expected;
 };
 
+void PrintTo(const Row &row, std::ostream *os)
+{
+    *os << row.name;
+}
+
 class CameraListTest : public testing::TestWithParam<Row> {};
 
 TEST_P(CameraListTest, LeavesTheExpectedCameras)
@@ -69,12 +73,6 @@ const Row Rows[] = {
     {"removal compares whole names", "C_10/1", Row::Remove, "C_1/1", "C_10/1"},
 };
 
-INSTANTIATE_TEST_SUITE_P(Rows, CameraListTest, testing::ValuesIn(Rows),
-                         [](const testing::TestParamInfo<Row> &info) {
-                             std::string name = info.param.name;
-                             for (char &c : name)
-                                 c = std::isalnum(static_cast<unsigned char>(c)) ? c : '_';
-                             return name;
-                         });
+INSTANTIATE_TEST_SUITE_P(Rows, CameraListTest, testing::ValuesIn(Rows), rowName<Row>);
 
 } // namespace
