@@ -6,7 +6,6 @@
 
 #include <gtest/gtest.h>
 
-#include <atomic>
 
 namespace {
 
@@ -266,35 +265,5 @@ INSTANTIATE_TEST_SUITE_P(EveryOperation, SendPath, testing::Values(
     Operation{"camera_list_update_with_a_longer_time_out", "UpdRecTmcard 40000 requester", Result, {}, [](auto &c, Done &d) { return c.UpdateTimecardCameraList(answer(Three), {}, d.take(), 40000); }}),
     [](const auto &op) { return op.param.name; });
 // clang-format on
-
-// Answers on the tunnel's own thread while this thread keeps sending,
-// replacing the control and switching the requester.
-TEST(ControlThreads, EveryRequestCompletesOnceWhileTheHostSendsAndSwitchesRequester)
-{
-    TestTunnel tunnel(TestTunnel::Delivery::OtherThread);
-    tunnel.setResponder([](const TestTunnel::Sent &sent) {
-        return Answer{true, "0", Contents.value(sent.command), true};
-    });
-    int requesters[2] = {};
-    std::atomic<int> completed{0};
-    const ControlResultCallback count = [&](bool ok, bool flag) { completed += ok && flag; };
-    constexpr int Rounds = 200;
-    QSharedPointer<IRecordingSettingControl> control;
-    for (int round = 0; round < Rounds; ++round) {
-        if (round % 10 == 0)
-            control = makeControl(&tunnel); // the old one still has answers on their way
-        control->SetClientID(&requesters[round % 2]);
-        ASSERT_TRUE(control->RemoveTimecardCameraList(3, cameras(1), count));
-        // Goes on from the tunnel's thread with the requester that this thread writes.
-        ASSERT_TRUE(control->DeleteSchedule(Summary, [&, next = control](bool, bool) {
-            next->UpdateTimecardCameraList(answer(Three), {}, count, 0);
-        }));
-    }
-    for (int i = 0; completed < 2 * Rounds && i < 50'000'000; ++i)
-        control->SetClientID(&requesters[i % 2]);
-    control.reset();
-    tunnel.waitIdle();
-    EXPECT_EQ(completed, 2 * Rounds);
-}
 
 } // namespace

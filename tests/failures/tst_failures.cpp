@@ -229,7 +229,9 @@ INSTANTIATE_TEST_SUITE_P(Chains, Walk, ::testing::ValuesIn(rows()), [](const aut
 
 // What the host's thread does while every chain runs on several plug-ins,
 // each on a tunnel answering on its own thread and fed by two requester
-// threads. Labelled "threads": ThreadSanitizer runs these again.
+// threads. Every request writes its requester's identity into the control,
+// which sends from the tunnels' threads read. Labelled "threads":
+// ThreadSanitizer runs these again.
 enum class Meanwhile {
     Nothing,
     // The control pointer is read and replaced under one lock, and each

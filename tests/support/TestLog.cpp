@@ -11,15 +11,13 @@ namespace {
 thread_local TestLog::Record t_pending{};
 } // namespace
 
-TestLog::TestLog(std::int32_t moduleId, bool withRegister) : m_moduleId(moduleId)
+TestLog::TestLog(std::int32_t moduleId) : m_moduleId(moduleId)
 {
     object.context = this;
-    if (withRegister) {
-        object.registerModule = [](void *context, std::int32_t, const char *, std::int32_t *id) {
-            if (context && id)
-                *id = static_cast<TestLog *>(context)->m_moduleId;
-        };
-    }
+    object.registerModule = [](void *context, std::int32_t, const char *, std::int32_t *id) {
+        if (context && id)
+            *id = static_cast<TestLog *>(context)->m_moduleId;
+    };
     object.filter = [](void *context, std::uint32_t selector, std::int32_t, const char *file,
                        std::int32_t line) -> std::int32_t {
         auto *self = static_cast<TestLog *>(context);

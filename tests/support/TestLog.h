@@ -23,8 +23,7 @@ public:
         int level() const { return static_cast<int>(selector & 0xff); }
     };
 
-    // withRegister: whether the object offers a register function.
-    explicit TestLog(std::int32_t moduleId = 7, bool withRegister = true);
+    explicit TestLog(std::int32_t moduleId = 7);
     ~TestLog();
     TestLog(const TestLog &) = delete;
     TestLog &operator=(const TestLog &) = delete;

@@ -1,6 +1,5 @@
 #include "TestTunnel.h"
 
-#include <algorithm>
 
 TestTunnel::~TestTunnel()
 {
@@ -9,12 +8,6 @@ TestTunnel::~TestTunnel()
     m_worker.join();
     for (const Held &held : std::deque<Held>(std::move(m_held)))
         deliver({held.first, Answer{false, QString(), QString(), false}});
-}
-
-void TestTunnel::setDelivery(Delivery delivery)
-{
-    locked([&] { m_delivery = delivery; });
-    m_wake.notify_all();
 }
 
 QStringList TestTunnel::commands() const
@@ -32,10 +25,8 @@ bool TestTunnel::SendRequest(const QString &pluginId, void *clientId, int kind,
                     request.body, request.timeoutMs, request.flag, request.extra};
     Held held{request.onResponse, Answer{}};
     std::unique_lock<std::mutex> lock(m_mutex);
-    if (m_refuseNext > 0 || (m_refusal && m_refusal(sent))) {
-        m_refuseNext = std::max(0, m_refuseNext - 1);
+    if (m_refusal && m_refusal(sent))
         return false;
-    }
     m_sent.append(sent);
     if (m_responder) {
         held.second = m_responder(sent);

@@ -44,7 +44,6 @@ public:
     explicit TestTunnel(Delivery delivery = Delivery::Immediately) : m_delivery(delivery) {}
     ~TestTunnel() override;
 
-    void setDelivery(Delivery delivery);
     void setResponder(Responder responder)
     {
         locked([&] { m_responder = std::move(responder); });
@@ -53,11 +52,7 @@ public:
     {
         locked([&] { m_answers.push_back(answer); });
     }
-    // The next n sends are refused, and so is every send the predicate picks.
-    void refuseNext(int n = 1)
-    {
-        locked([&] { m_refuseNext = n; });
-    }
+    // Every send the predicate picks is refused.
     void setRefusal(std::function<bool(const Sent &)> refuse)
     {
         locked([&] { m_refusal = std::move(refuse); });
@@ -103,10 +98,9 @@ private:
     mutable std::mutex m_mutex;
     std::condition_variable m_wake;
     std::condition_variable m_idle;
-    Delivery m_delivery;
+    const Delivery m_delivery;
     Responder m_responder;
     std::deque<Answer> m_answers;
-    int m_refuseNext = 0;
     std::function<bool(const Sent &)> m_refusal;
     QList<Sent> m_sent;
     std::deque<Held> m_held;
