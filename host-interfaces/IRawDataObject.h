@@ -9,6 +9,8 @@ public:
     virtual ~IRawDataObject() = default;
     virtual void ReadDataFromDataStream(QDataStream &stream) = 0;
     virtual void WriteDataToDataStream(QDataStream &stream) const = 0;
+    // Not defaulted: that would make it noexcept, and every override with it.
+    // NOLINTNEXTLINE(modernize-use-equals-default)
     virtual IRawDataObject &operator=(const IRawDataObject &) { return *this; }
 
 protected:

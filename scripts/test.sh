@@ -1,6 +1,8 @@
 #!/usr/bin/env bash
 # Installs what is missing, builds, and runs every test: the whole suite in a
-# normal build, then the threaded tests again under ThreadSanitizer.
+# normal build (the fuzz corpora replayed among it), clang-tidy over the
+# product's sources, the threaded tests again under ThreadSanitizer, and each
+# fuzz target for a short run.
 set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 cd "$root"
@@ -9,7 +11,11 @@ scripts/setup.sh
 scripts/build.sh build
 ctest --test-dir build --output-on-failure -j"$(nproc)"
 
+scripts/tidy.sh build
+
 # Debian's Qt is not built for ThreadSanitizer; see tests/tsan.supp.
 scripts/build.sh build-tsan -DRECSCHED_TSAN=ON -DRECSCHED_BENCH=OFF
 TSAN_OPTIONS="suppressions=$root/tests/tsan.supp halt_on_error=1 second_deadlock_stack=1" \
     ctest --test-dir build-tsan --output-on-failure -j"$(nproc)" -L threads
+
+scripts/fuzz.sh "${FUZZ_SECONDS:-30}"

@@ -9,12 +9,8 @@ RecordingScheduleDataObject::RecordingScheduleDataObject()
     initContent();
 }
 
-RecordingScheduleDataObject::RecordingScheduleDataObject(const RecordingScheduleDataObject &other)
-    : IRawDataObject(other),
-      m_recScheduleType(other.m_recScheduleType),
-      m_customizeContent(other.m_customizeContent)
-{
-}
+RecordingScheduleDataObject::RecordingScheduleDataObject(const RecordingScheduleDataObject &other) =
+    default;
 
 RecordingScheduleDataObject &
 RecordingScheduleDataObject::operator=(const RecordingScheduleDataObject &other)
