@@ -24,7 +24,7 @@ public:
     };
 
     // Longest record text; longer ones are cut and marked.
-    static constexpr std::size_t MaxText = 16 * 1024;
+    static constexpr std::size_t MaxText = std::size_t{16} * 1024;
     static constexpr int DefaultThreshold = 2;
 
     TraceLogger(Destination destination, int threshold);

@@ -82,8 +82,8 @@ struct VariantTreeBuilder::Frame
                 map.insert(group.name, takeGroupValue(group));
             // White space between child elements is layout, not content.
             if (hasContentText)
-                map.insert(TextKey, std::move(text));
-            value = std::move(map);
+                map.insert(TextKey, text);
+            value = map; // shared, not copied
         }
         attributes = QVariantMap();
         text = QString();
@@ -143,8 +143,7 @@ QVariant VariantTreeBuilder::takeResult()
         document.children.front().values.size() != 1)
         return {};
     QVariantMap root;
-    root.insert(document.children.front().name,
-                std::move(document.children.front().values.front()));
+    root.insert(document.children.front().name, document.children.front().values.front());
     document.children.clear();
     return root;
 }
