@@ -83,10 +83,19 @@ INSTANTIATE_TEST_SUITE_P(
             "two time cards with cameras are another schedule",
             "#3 KOLT2 Default Event Recording [C_1/1] | #4 KOLT2 Default Event Recording [C_2/1]",
             RecInfo, summary(4)),
-        // Qt reads "4294967297" as 1, the default time card, which would be left out.
-        inForce("identifier outside int range is not the default time card",
-                "#4294967297 KOLT2 Customize Recording {lobby} [C_1/1]", RecInfo,
-                summary(2, Lobby)),
+        // Qt reads "4294967297" as 1, the default time card, which would be left out. The
+        // server hands out no such identifier now; a file an older server wrote holds it.
+        CommandRow{"identifier outside int range is not the default time card",
+                   "#2 KOLT2 Customize Recording {lobby} [C_1/1]",
+                   RecInfo,
+                   QVariant(),
+                   "GetRecTmcard(all)",
+                   "",
+                   true,
+                   "0",
+                   summary(2, Lobby),
+                   {"UPDATE tmcard SET id = 4294967297 WHERE id = 2",
+                    "UPDATE cam SET tmcard_id = 4294967297 WHERE tmcard_id = 2"}},
         document(
             "two day runs by two intervals give four rectangles run by run",
             frame("1.0 2.0 3.0 5.0", "0,28800 64800,86400", "Continuous"),

@@ -2,14 +2,21 @@
 
 #include "RecordingServer.h"
 
+#include <QFile>
 #include <QSqlDatabase>
 #include <QSqlQuery>
 #include <QTemporaryDir>
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <atomic>
 #include <csignal>
+#include <functional>
+#include <iostream>
 #include <memory>
+#include <sys/stat.h>
+#include <thread>
 #include <unistd.h>
 
 namespace {
@@ -20,6 +27,15 @@ const auto insert = [](const QString &card) { return tag("InsRecTmcard", tag("Tm
 const auto update = [](const QString &card) { return tag("UpdRecTmcard", tag("Tmcard", card)); };
 const auto refusal = [](int code, const QString &reason) {
     return tag("Error", tag("Code", QString::number(code)) + tag("Reason", reason));
+};
+const auto card = [](qint64 id, const QString &name, int revision = 1) {
+    return tag("Tmcard", tag("Revision", QString::number(revision)) +
+                             tag("TmcardID", QString::number(id)) + tag("Name", name) +
+                             "<Mapping></Mapping>");
+};
+// Elements nested this many levels deep.
+const auto nest = [](int levels) {
+    return QString("<Ele>").repeated(levels) + QString("</Ele>").repeated(levels);
 };
 
 // A fresh database holds this one time card: continuous all week.
@@ -67,6 +83,7 @@ struct Row
     // When set, the request runs in a child process that is killed (SIGKILL
     // from the statement hook) before this statement of its write commits.
     int killAtStatement = 0;
+    QString seeded = {}; // the time cards before it, when not the fresh server's
     friend void PrintTo(const Row &row, std::ostream *out) { *out << row.name; }
 };
 
@@ -76,6 +93,9 @@ class Requests : public ServerTest, public testing::WithParamInterface<Row>
 TEST_P(Requests, AnswerAndLeaveTheTimecards)
 {
     const Row &row = GetParam();
+    if (!row.seeded.isEmpty()) {
+        ASSERT_EQ(ask("seed", cards(row.seeded)).code, "0");
+    }
     if (row.killAtStatement == 0) {
         const ServerAnswer answer = ask(row.command, row.body);
         EXPECT_EQ(answer.code, row.code);
@@ -105,6 +125,9 @@ const QString kCameras =
     "</CamList>";
 const QString kCard = "<Revision>1</Revision><TmcardID>1</TmcardID><Name>N</Name><Mapping/>";
 const QString kDelete = "<DelTmcard><Revision>1</Revision><TmcardID>1</TmcardID></DelTmcard>";
+const QString kEvent = "KOLT2 Default Event Recording";
+const QString kCustomize = "KOLT2 Customize Recording";
+const QString kDeep = "<Revision>1</Revision><TmcardID>1</TmcardID><Name>N</Name><Mapping>";
 
 const Row rows[] = {
     {"read_of_one", "GetRecTmcard", "<GetRecTmcard><TmcardID>1</TmcardID></GetRecTmcard>", "0",
@@ -166,23 +189,171 @@ const Row rows[] = {
      "Tmcard>"},
     {"seed_of_another_answer", "seed", "<InsRecTmcardRes/>", "3",
      "root <InsRecTmcardRes> where <GetRecTmcardRes> belongs"},
+    {"insert_nested_64_levels_deep_is_stored", "InsRecTmcard",
+     insert("<Name>N</Name><Mapping>" + nest(61) + "</Mapping>"), "0",
+     "<InsRecTmcardRes><TmcardID>2</TmcardID></InsRecTmcardRes>",
+     kDefault + "<Tmcard><Revision>1</Revision><TmcardID>2</TmcardID><Name>N</Name><Mapping>" +
+         nest(61) + "</Mapping></Tmcard>"},
+    {"insert_nested_65_levels_deep_is_refused", "InsRecTmcard",
+     insert("<Name>N</Name><Mapping>" + nest(62) + "</Mapping>"), "4",
+     refusal(4, "nested deeper than 64 levels")},
+    {"update_nested_a_hundred_thousand_levels_deep_is_refused", "UpdRecTmcard",
+     update(kDeep + nest(100000) + "</Mapping>"), "4", refusal(4, "nested deeper than 64 levels")},
+    {"seed_nested_65_levels_deep_is_refused", "seed",
+     cards("<Tmcard>" + kDeep + nest(62) + "</Mapping></Tmcard>"), "4",
+     "nested deeper than 64 levels"},
+    {"insert_of_a_second_time_card_with_a_fixed_name_is_refused", "InsRecTmcard",
+     insert("<Revision>1</Revision><TmcardID>1</TmcardID><Name>" + kEvent + "</Name><Mapping/>"),
+     "9", refusal(9, "time card 1 is named &quot;KOLT2 Default Event Recording&quot; already"),
+     card(1, kEvent), 0, card(1, kEvent)},
+    {"update_giving_a_time_card_the_fixed_name_another_holds_is_refused", "UpdRecTmcard",
+     update("<Revision>1</Revision><TmcardID>2</TmcardID><Name>" + kCustomize +
+            "</Name><Mapping/>"),
+     "9", refusal(9, "time card 1 is named &quot;KOLT2 Customize Recording&quot; already"),
+     card(1, kCustomize) + card(2, "Hall"), 0, card(1, kCustomize) + card(2, "Hall")},
+    {"update_keeping_its_own_fixed_name_is_carried_out", "UpdRecTmcard",
+     update("<Revision>1</Revision><TmcardID>1</TmcardID><Name>" + kCustomize +
+            "</Name><Mapping/>"),
+     "0", "<UpdRecTmcardRes><TmcardID>1</TmcardID><Revision>2</Revision></UpdRecTmcardRes>",
+     card(1, kCustomize, 2), 0, card(1, kCustomize)},
+    {"insert_takes_2147483647_as_the_last_identifier", "InsRecTmcard",
+     insert("<Name>N</Name><Mapping/>"), "0",
+     "<InsRecTmcardRes><TmcardID>2147483647</TmcardID></InsRecTmcardRes>",
+     card(2147483646, "Top") + card(2147483647, "N"), 0, card(2147483646, "Top")},
+    {"insert_after_identifier_2147483647_is_refused", "InsRecTmcard",
+     insert("<Name>N</Name><Mapping/>"), "10",
+     refusal(10, "no time card identifier left up to 2147483647"), card(2147483647, "Top"), 0,
+     card(2147483647, "Top")},
+    {"seed_with_an_identifier_beyond_31_bits_is_refused", "seed", cards(card(2147483648, "Big")),
+     "5", "time card identifier 2147483648 is beyond 2147483647"},
 };
 
 INSTANTIATE_TEST_SUITE_P(Server, Requests, testing::ValuesIn(rows),
                          [](const auto &info) { return info.param.name; });
 
-TEST_F(ServerTest, NewerSchemaIsRefusedAndEveryRequestAnswersStorageFailure)
+// Runs statements on a database file through a connection of the test's own.
+void runSql(const QString &path, const QStringList &statements)
+{
+    {
+        QSqlDatabase db = QSqlDatabase::addDatabase("QSQLITE", "test-file");
+        db.setDatabaseName(path);
+        ASSERT_TRUE(db.open());
+        for (const QString &statement : statements)
+            ASSERT_TRUE(QSqlQuery(db).exec(statement)) << statement.toStdString();
+    }
+    QSqlDatabase::removeDatabase("test-file");
+}
+
+QByteArray bytesOf(const QString &path)
+{
+    QFile file(path);
+    return file.open(QIODevice::ReadOnly) ? file.readAll() : QByteArray("(no file)");
+}
+
+struct FileRow
+{
+    const char *name;
+    std::function<void(const QString &path)> make;
+    // After the path; empty when the file opens as a fresh server's.
+    const char *reason;
+    friend void PrintTo(const FileRow &row, std::ostream *out) { *out << row.name; }
+};
+
+class Opening : public ServerTest, public testing::WithParamInterface<FileRow>
+{};
+
+// A refused file is left as it was: no tables added, no WAL switch, no version.
+TEST_P(Opening, InitialisesAFreshFileAndLeavesOthersByteForByte)
+{
+    const FileRow &row = GetParam();
+    const QString file = dir.filePath("file.db");
+    row.make(file);
+    const QByteArray before = bytesOf(file);
+    RecordingServer opened(file);
+    const Refusal refused = opened.open();
+    if (*row.reason == 0) {
+        EXPECT_FALSE(refused.refused()) << refused.reason.toStdString();
+        EXPECT_EQ(opened.dump().toStdString(), cards(kDefault).toStdString());
+        return;
+    }
+    EXPECT_EQ(refused.reason.toStdString(), (file + row.reason).toStdString());
+    EXPECT_EQ(opened.handle("DelTmcard", "<DelTmcard/>").content, refusal(8, "database not open"));
+    EXPECT_EQ(bytesOf(file), before);
+}
+
+const auto writeFile = [](const QByteArray &bytes) {
+    return [bytes](const QString &path) {
+        QFile file(path);
+        ASSERT_TRUE(file.open(QIODevice::WriteOnly) && file.write(bytes) == bytes.size());
+    };
+};
+
+const FileRow fileRows[] = {
+    {"file_that_does_not_exist_is_initialised", [](const QString &) {}, ""},
+    {"empty_file_is_initialised", writeFile(""), ""},
+    {"database_without_tables_is_initialised",
+     [](const QString &path) { runSql(path, {"VACUUM"}); }, ""},
+    {"newer_version_is_refused",
+     [](const QString &path) {
+         runSql(path, {"CREATE TABLE tmcard (id INTEGER)", "PRAGMA user_version=2"});
+     },
+     ": schema version 2, this server knows 1"},
+    {"database_of_another_program_is_refused",
+     [](const QString &path) {
+         runSql(path, {"CREATE TABLE t (x)", "INSERT INTO t VALUES (1)"});
+     },
+     ": not a time card database: it holds tables of another kind"},
+    {"file_that_is_not_a_database_is_refused", writeFile(QByteArray("no database ").repeated(400)),
+     ": not a database: file is not a database Unable to execute statement"},
+};
+
+INSTANTIATE_TEST_SUITE_P(Server, Opening, testing::ValuesIn(fileRows),
+                         [](const auto &info) { return info.param.name; });
+
+// SQLite would open the file for reading and fail at its first write. The
+// child opens it as a user who may not write it (root may write any file).
+TEST_F(ServerTest, ReadOnlyFileIsRefusedPlainly)
 {
     server.reset();
-    {
-        QSqlDatabase db = QSqlDatabase::addDatabase("QSQLITE", "newer");
-        db.setDatabaseName(path());
-        ASSERT_TRUE(db.open() && QSqlQuery(db).exec("PRAGMA user_version=2"));
+    ASSERT_EQ(chmod(QFile::encodeName(path()).constData(), 0444), 0);
+    ASSERT_EQ(chmod(QFile::encodeName(dir.path()).constData(), 0755), 0);
+    GTEST_FLAG_SET(death_test_style, "fast");
+    EXPECT_EXIT(
+        {
+            if (getuid() == 0 && (setgid(65534) != 0 || setuid(65534) != 0))
+                _exit(2);
+            RecordingServer child(path());
+            std::cerr << child.open().reason.toStdString();
+            _exit(0);
+        },
+        testing::ExitedWithCode(0),
+        "recserver.db: the file is read-only, and the server writes to it$");
+}
+
+// Each writer checks for the name in the transaction that inserts it.
+TEST_F(ServerTest, OfTwoWritersInsertingOneFixedNameAtOnceOneIsRefused)
+{
+    for (const char *name : {"KOLT2 Default Continuous Recording", "KOLT2 Default Event Recording",
+                             "KOLT2 Customize Recording"}) {
+        std::atomic<int> ready{0};
+        std::string codes[2];
+        std::thread writers[2];
+        for (int i = 0; i < 2; ++i) {
+            writers[i] = std::thread([&, i] {
+                RecordingServer writer(path());
+                codes[i] = writer.open().refused() ? "not open" : "opened";
+                for (++ready; ready < 2;)
+                    std::this_thread::yield();
+                codes[i] = writer.handle("InsRecTmcard", insert(tag("Name", name) + "<Mapping/>"))
+                               .code.toStdString();
+            });
+        }
+        for (std::thread &writer : writers)
+            writer.join();
+        std::sort(std::begin(codes), std::end(codes));
+        EXPECT_EQ(codes[0] + " " + codes[1], "0 9") << name;
+        EXPECT_EQ(server->dump().count(tag("Name", name)), 1) << name;
     }
-    QSqlDatabase::removeDatabase("newer");
-    RecordingServer newer(path());
-    EXPECT_EQ(newer.open().reason, path() + ": schema version 2, this server knows 1");
-    EXPECT_EQ(newer.handle("DelTmcard", "<DelTmcard/>").content, refusal(8, "database not open"));
 }
 
 const QString kNested =
