@@ -5,8 +5,6 @@
 #include <QFile>
 #include <QJsonDocument>
 #include <QJsonObject>
-#include <QSqlDatabase>
-#include <QSqlQuery>
 
 #include <gtest/gtest.h>
 
@@ -27,21 +25,6 @@ void LivePlugin::seed(const QString &getRecTmcardRes)
     Refusal refusal;
     m_tunnel->runOnBackend([&] { refusal = m_server->seed(getRecTmcardRes); });
     ASSERT_FALSE(refusal.refused()) << refusal.text().toStdString();
-}
-
-void LivePlugin::alterDatabase(const QStringList &statements)
-{
-    m_tunnel->runOnBackend([&] {
-        {
-            QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"),
-                                                        QStringLiteral("live-plugin-alter"));
-            db.setDatabaseName(m_dir.filePath(QStringLiteral("server.db")));
-            EXPECT_TRUE(db.open());
-            for (const QString &statement : statements)
-                EXPECT_TRUE(QSqlQuery(db).exec(statement)) << statement.toStdString();
-        }
-        QSqlDatabase::removeDatabase(QStringLiteral("live-plugin-alter"));
-    });
 }
 
 QString LivePlugin::dump()
