@@ -292,6 +292,12 @@ Result<std::vector<Timecard>> parseTimecardList(const QString &document)
                          QStringLiteral("time card identifier %1 is not positive").arg(card->id));
                 break;
             }
+            if (card->id > kMaxTimecardId) {
+                badValue(cursor, QStringLiteral("time card identifier %1 is beyond %2")
+                                     .arg(card->id)
+                                     .arg(kMaxTimecardId));
+                break;
+            }
             if (!ids.insert(card->id).second) {
                 badValue(cursor, QStringLiteral("time card %1 given twice").arg(card->id));
                 break;

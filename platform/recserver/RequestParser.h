@@ -30,5 +30,5 @@ Result<Timecard> parseInsertRequest(const QString &body);
 // (a time card text taken from a read answer).
 Result<Timecard> parseUpdateRequest(const QString &body);
 Result<DeleteRequest> parseDeleteRequest(const QString &body);
-// Identifiers must be unique within the document.
+// Identifiers must be unique within the document, from 1 to kMaxTimecardId.
 Result<std::vector<Timecard>> parseTimecardList(const QString &document);

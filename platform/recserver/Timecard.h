@@ -4,6 +4,10 @@
 
 #include <vector>
 
+// Clients read time card identifiers as 32-bit signed integers: the server
+// hands out and takes only identifiers from 1 to this.
+constexpr qint64 kMaxTimecardId = 2147483647;
+
 // A camera as the server stores it: its place on the time card is its index.
 struct Camera
 {

@@ -1,10 +1,13 @@
 #include "TimecardStore.h"
 
+#include <QFileInfo>
 #include <QSqlDatabase>
 #include <QSqlError>
 #include <QSqlQuery>
 #include <QVariant>
 
+#include <algorithm>
+#include <iterator>
 #include <limits>
 
 namespace {
@@ -37,6 +40,43 @@ const char *const kSchema[] = {
 Refusal openFailure(const QString &path, const QString &what, const QSqlError &error)
 {
     return {ServerCode::StorageFailure, QStringLiteral("%1: %2: %3").arg(path, what, error.text())};
+}
+
+// Names the plug-in looks time cards up by: there may be one of each, or the
+// plug-in would put cameras on whichever it found first.
+const QLatin1String kFixedNames[] = {
+    QLatin1String("KOLT2 Default Continuous Recording"),
+    QLatin1String("KOLT2 Default Event Recording"),
+    QLatin1String("KOLT2 Customize Recording"),
+};
+
+bool isFixedName(const QString &name)
+{
+    return std::find(std::begin(kFixedNames), std::end(kFixedNames), name) != std::end(kFixedNames);
+}
+
+// Decides from reads alone whether the file is ours, new or neither, so that
+// a file that is not ours is left byte for byte as it was.
+Refusal inspect(const QSqlDatabase &db, const QString &path, int knownVersion)
+{
+    QSqlQuery query(db);
+    if (!query.exec(QStringLiteral("SELECT count(*) FROM sqlite_master")) || !query.next())
+        return openFailure(path, QStringLiteral("not a database"), query.lastError());
+    const bool hasTables = query.value(0).toLongLong() != 0;
+    if (!query.exec(QStringLiteral("PRAGMA user_version")) || !query.next())
+        return openFailure(path, QStringLiteral("not a database"), query.lastError());
+    const int version = query.value(0).toInt();
+    if (version != 0 && version != knownVersion)
+        return {ServerCode::StorageFailure,
+                QStringLiteral("%1: schema version %2, this server knows %3")
+                    .arg(path)
+                    .arg(version)
+                    .arg(knownVersion)};
+    if (version == 0 && hasTables)
+        return {ServerCode::StorageFailure,
+                QStringLiteral("%1: not a time card database: it holds tables of another kind")
+                    .arg(path)};
+    return {};
 }
 
 // WAL: readers on other connections never block the writer. NORMAL
@@ -183,8 +223,14 @@ Refusal TimecardStore::open(const QString &path)
     // Another connection to the same file (a second server, a seeding tool)
     // may hold the write lock for a moment.
     db.setConnectOptions(QStringLiteral("QSQLITE_BUSY_TIMEOUT=5000"));
-    Refusal refusal = db.open() ? configure(db, path)
+    // Said plainly: SQLite would open it for reading and fail at the first write.
+    if (const QFileInfo file(path); file.exists() && !file.isWritable())
+        return {ServerCode::StorageFailure,
+                QStringLiteral("%1: the file is read-only, and the server writes to it").arg(path)};
+    Refusal refusal = db.open() ? inspect(db, path, kSchemaVersion)
                                 : openFailure(path, QStringLiteral("cannot open"), db.lastError());
+    if (!refusal.refused())
+        refusal = configure(db, path);
     if (!refusal.refused())
         refusal = prepareSchema(db, path);
     if (refusal.refused())
@@ -331,11 +377,49 @@ Result<qint64> TimecardStore::insertCard(Transaction &transaction, const Timecar
     return id;
 }
 
+// Checked in the write's own transaction, so two writers cannot both pass.
+Refusal TimecardStore::checkFixedName(Transaction &transaction, const QString &name,
+                                      qint64 exceptId)
+{
+    if (!isFixedName(name))
+        return {};
+    QSqlQuery query = transaction.prepare(
+        QStringLiteral("SELECT id FROM tmcard WHERE name = ? AND id <> ? ORDER BY id LIMIT 1"));
+    query.addBindValue(name);
+    query.addBindValue(exceptId);
+    if (!transaction.exec(query))
+        return transaction.failure();
+    if (!query.next())
+        return {};
+    return {ServerCode::FixedNameTaken, QStringLiteral("time card %1 is named \"%2\" already")
+                                            .arg(query.value(0).toLongLong())
+                                            .arg(name)};
+}
+
+// AUTOINCREMENT takes one past the highest identifier ever used.
+Refusal TimecardStore::checkIdentifierLeft(Transaction &transaction)
+{
+    QSqlQuery query = transaction.prepare(QStringLiteral(
+        "SELECT max(ifnull((SELECT seq FROM sqlite_sequence WHERE name = 'tmcard'), 0),"
+        " ifnull((SELECT max(id) FROM tmcard), 0))"));
+    if (!transaction.exec(query) || !query.next())
+        return transaction.failure();
+    if (query.value(0).toLongLong() >= kMaxTimecardId)
+        return {ServerCode::NoIdentifierLeft,
+                QStringLiteral("no time card identifier left up to %1").arg(kMaxTimecardId)};
+    return {};
+}
+
 Result<qint64> TimecardStore::insert(const Timecard &card)
 {
     Transaction transaction(database(), m_statementHook, true);
     if (!transaction.active())
         return transaction.failure();
+    Refusal refusal = checkFixedName(transaction, card.name, 0);
+    if (!refusal.refused())
+        refusal = checkIdentifierLeft(transaction);
+    if (refusal.refused())
+        return refusal;
     Timecard stored = card;
     stored.revision = 1;
     return transaction.commit(insertCard(transaction, stored, false));
@@ -370,6 +454,9 @@ Result<qint64> TimecardStore::update(const Timecard &card)
         return refusal;
     if (card.revision == std::numeric_limits<qint64>::max())
         return Refusal{ServerCode::BadValue, QStringLiteral("revision cannot be raised further")};
+    refusal = checkFixedName(transaction, card.name, card.id);
+    if (refusal.refused())
+        return refusal;
 
     const qint64 revision = card.revision + 1;
     QSqlQuery query = transaction.prepare(

@@ -24,13 +24,16 @@ public:
     TimecardStore(const QString &connectionName, const std::function<void(int)> &statementHook);
 
     // Opens the file, creating the schema and the default time card on
-    // first use: identifier 1, "Default Schedule", continuous all week.
+    // first use: identifier 1, "Default Schedule", continuous all week. A
+    // file that is read-only, of a newer version or of another program (tables
+    // but no version) is refused before anything is written to it.
     Refusal open(const QString &path);
 
     // Every time card, or the one with this identifier (none when it is not
     // held), in identifier order.
     Result<std::vector<Timecard>> read(std::optional<qint64> id);
-    // The new time card's identifier.
+    // The new time card's identifier, from 1 to kMaxTimecardId; refused
+    // when another time card holds the fixed name it carries.
     Result<qint64> insert(const Timecard &card);
     // The time card's new revision.
     Result<qint64> update(const Timecard &card);
@@ -48,6 +51,9 @@ private:
     Refusal readCameras(Transaction &transaction, std::optional<qint64> id,
                         std::vector<Timecard> &cards);
     Refusal checkRevision(Transaction &transaction, qint64 id, qint64 revision);
+    // Refused when a time card other than exceptId holds this fixed name.
+    Refusal checkFixedName(Transaction &transaction, const QString &name, qint64 exceptId);
+    Refusal checkIdentifierLeft(Transaction &transaction);
     Refusal insertCameras(Transaction &transaction, qint64 id, const std::vector<Camera> &cameras);
     Result<qint64> insertCard(Transaction &transaction, const Timecard &card, bool keepId);
 

@@ -51,6 +51,16 @@ QXmlStreamReader::TokenType XmlCursor::nextToken()
     case QXmlStreamReader::DTD:
         refuse(ServerCode::MalformedXml, QStringLiteral("unexpected markup"));
         return QXmlStreamReader::NoToken;
+    case QXmlStreamReader::StartElement:
+        if (++m_depth > kMaxDepth) {
+            refuse(ServerCode::BadStructure,
+                   QStringLiteral("nested deeper than %1 levels").arg(kMaxDepth));
+            return QXmlStreamReader::NoToken;
+        }
+        return token;
+    case QXmlStreamReader::EndElement:
+        --m_depth;
+        return token;
     default:
         return token;
     }
@@ -61,6 +71,7 @@ bool XmlCursor::enterRoot()
     while (!m_reader.atEnd()) {
         switch (m_reader.readNext()) {
         case QXmlStreamReader::StartElement:
+            m_depth = 1;
             return true;
         case QXmlStreamReader::DTD:
             m_refusal = {ServerCode::MalformedXml, QStringLiteral("a DTD is not accepted")};

@@ -11,11 +11,17 @@
 // Walks a request body element by element and records the first reason to
 // refuse it. White space between elements, comments and processing
 // instructions are skipped; a DTD is refused (no entity expansion from
-// clients). Once a structural refusal is recorded, finish() still reads to
+// clients), and so are elements nested deeper than kMaxDepth. Once a
+// structural refusal is recorded, finish() still reads to
 // the end so that a body that is not well-formed is reported as such.
 class XmlCursor
 {
 public:
+    // Levels of elements, the root counted as one. A real time card nests
+    // about 8; a deeper one is refused before it is stored, since reading it
+    // back costs its readers with the square of the depth.
+    static constexpr int kMaxDepth = 64;
+
     explicit XmlCursor(const QString &text);
 
     // Moves to the root element; false when there is none.
@@ -47,4 +53,5 @@ private:
 
     QXmlStreamReader m_reader;
     Refusal m_refusal;
+    int m_depth = 0; // elements open, the root included
 };

@@ -1,5 +1,7 @@
 #include "CommandTable.h"
 
+#include "RunSql.h"
+
 #include <QDebug>
 #include <QRegularExpression>
 
@@ -128,6 +130,7 @@ TEST_P(Commands, Answer)
     LivePlugin live;
     if (!row.seed.isEmpty())
         live.seed(seedDocument(row.seed));
+    runSql(live.databasePath(), row.alter);
     const QString before = timecardsOf(live.dump());
     const ReplyCollector::Reply reply = live.request(row.command, row.payload);
     EXPECT_EQ(messagesOf(live.sent()).toStdString(), row.messages.toStdString());

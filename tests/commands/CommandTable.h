@@ -22,6 +22,7 @@ struct CommandRow
     bool flag;
     QString code;
     QVariant data = QVariant();
+    QStringList alter = {}; // SQL run on the server's file after the seed
 };
 
 inline void PrintTo(const CommandRow &row, std::ostream *os)

@@ -28,9 +28,9 @@ QString frame(QString days, QString spans, const QString &mode, const QString &m
 }
 
 CommandRow inForce(const char *name, const QString &seed, const QString &command,
-                   const QVariant &data)
+                   const QVariant &data, const QStringList &alter = {})
 {
-    return {name, seed, command, QVariant(), "GetRecTmcard(all)", "", true, "0", data};
+    return {name, seed, command, QVariant(), "GetRecTmcard(all)", "", true, "0", data, alter};
 }
 
 // The document of the customised time card in force, holding the given mapping.
@@ -83,10 +83,11 @@ INSTANTIATE_TEST_SUITE_P(
             "two time cards with cameras are another schedule",
             "#3 KOLT2 Default Event Recording [C_1/1] | #4 KOLT2 Default Event Recording [C_2/1]",
             RecInfo, summary(4)),
-        // Qt reads "4294967297" as 1, the default time card, which would be left out.
+        // Qt reads "4294967297" as 1, the default time card, which would be left out. The
+        // server hands out no such identifier now; a file an older server wrote holds it.
         inForce("identifier outside int range is not the default time card",
-                "#4294967297 KOLT2 Customize Recording {lobby} [C_1/1]", RecInfo,
-                summary(2, Lobby)),
+                "#2 KOLT2 Customize Recording {lobby} [C_1/1]", RecInfo, summary(2, Lobby),
+                {"UPDATE tmcard SET id = 4294967297", "UPDATE cam SET tmcard_id = 4294967297"}),
         document(
             "two day runs by two intervals give four rectangles run by run",
             frame("1.0 2.0 3.0 5.0", "0,28800 64800,86400", "Continuous"),

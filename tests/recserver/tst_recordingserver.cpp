@@ -1,15 +1,20 @@
 // The simulated recording server on a file of its own: answers, codes, time cards after.
 
 #include "RecordingServer.h"
+#include "RunSql.h"
 
-#include <QSqlDatabase>
-#include <QSqlQuery>
+#include <QFile>
 #include <QTemporaryDir>
 
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <csignal>
+#include <future>
+#include <iostream>
 #include <memory>
+#include <sys/stat.h>
+#include <thread>
 #include <unistd.h>
 
 namespace {
@@ -20,6 +25,16 @@ const auto insert = [](const QString &card) { return tag("InsRecTmcard", tag("Tm
 const auto update = [](const QString &card) { return tag("UpdRecTmcard", tag("Tmcard", card)); };
 const auto refusal = [](int code, const QString &reason) {
     return tag("Error", tag("Code", QString::number(code)) + tag("Reason", reason));
+};
+const auto fields = [](qint64 id, const QString &name) {
+    return tag("Revision", "1") + tag("TmcardID", QString::number(id)) + tag("Name", name) +
+           "<Mapping></Mapping>";
+};
+const auto card = [](qint64 id, const QString &name) { return tag("Tmcard", fields(id, name)); };
+// A time card whose mapping nests elements this many levels below the Mapping.
+const auto deep = [](int levels, qint64 id) {
+    return fields(id, "N").replace("<Mapping>", "<Mapping>" + QString("<Ele>").repeated(levels) +
+                                                    QString("</Ele>").repeated(levels));
 };
 
 // A fresh database holds this one time card: continuous all week.
@@ -67,6 +82,7 @@ struct Row
     // When set, the request runs in a child process that is killed (SIGKILL
     // from the statement hook) before this statement of its write commits.
     int killAtStatement = 0;
+    QString seeded = {}; // the time cards before it, when not the fresh server's
     friend void PrintTo(const Row &row, std::ostream *out) { *out << row.name; }
 };
 
@@ -76,6 +92,8 @@ class Requests : public ServerTest, public testing::WithParamInterface<Row>
 TEST_P(Requests, AnswerAndLeaveTheTimecards)
 {
     const Row &row = GetParam();
+    if (!row.seeded.isEmpty())
+        ask("seed", cards(row.seeded));
     if (row.killAtStatement == 0) {
         const ServerAnswer answer = ask(row.command, row.body);
         EXPECT_EQ(answer.code, row.code);
@@ -105,6 +123,8 @@ const QString kCameras =
     "</CamList>";
 const QString kCard = "<Revision>1</Revision><TmcardID>1</TmcardID><Name>N</Name><Mapping/>";
 const QString kDelete = "<DelTmcard><Revision>1</Revision><TmcardID>1</TmcardID></DelTmcard>";
+const QString kEvent = "KOLT2 Default Event Recording";
+const QString kCustomize = "KOLT2 Customize Recording";
 
 const Row rows[] = {
     {"read_of_one", "GetRecTmcard", "<GetRecTmcard><TmcardID>1</TmcardID></GetRecTmcard>", "0",
@@ -166,62 +186,88 @@ const Row rows[] = {
      "Tmcard>"},
     {"seed_of_another_answer", "seed", "<InsRecTmcardRes/>", "3",
      "root <InsRecTmcardRes> where <GetRecTmcardRes> belongs"},
+    {"insert_nested_64_levels_deep_is_stored", "InsRecTmcard", insert(deep(61, 1)), "0",
+     "<InsRecTmcardRes><TmcardID>2</TmcardID></InsRecTmcardRes>",
+     kDefault + tag("Tmcard", deep(61, 2))},
+    {"insert_nested_65_levels_deep_is_refused", "InsRecTmcard", insert(deep(62, 1)), "4",
+     refusal(4, "nested deeper than 64 levels")},
+    {"update_nested_a_hundred_thousand_levels_deep_is_refused", "UpdRecTmcard",
+     update(deep(100000, 1)), "4", refusal(4, "nested deeper than 64 levels")},
+    {"seed_nested_65_levels_deep_is_refused", "seed", cards(tag("Tmcard", deep(62, 1))), "4",
+     "nested deeper than 64 levels"},
+    {"insert_of_a_second_time_card_with_a_fixed_name_is_refused", "InsRecTmcard",
+     insert(fields(1, kEvent)), "9",
+     refusal(9, "time card 1 is named &quot;KOLT2 Default Event Recording&quot; already"),
+     card(1, kEvent), 0, card(1, kEvent)},
+    {"update_giving_a_time_card_the_fixed_name_another_holds_is_refused", "UpdRecTmcard",
+     update(fields(2, kCustomize)), "9",
+     refusal(9, "time card 1 is named &quot;KOLT2 Customize Recording&quot; already"),
+     card(1, kCustomize) + card(2, "Hall"), 0, card(1, kCustomize) + card(2, "Hall")},
+    {"insert_after_identifier_2147483647_is_refused", "InsRecTmcard",
+     insert("<Name>N</Name><Mapping/>"), "10",
+     refusal(10, "no time card identifier left up to 2147483647"), card(2147483647, "Top"), 0,
+     card(2147483647, "Top")},
+    {"seed_with_an_identifier_beyond_31_bits_is_refused", "seed", cards(card(2147483648, "Big")),
+     "5", "time card identifier 2147483648 is beyond 2147483647"},
 };
 
 INSTANTIATE_TEST_SUITE_P(Server, Requests, testing::ValuesIn(rows),
                          [](const auto &info) { return info.param.name; });
 
-TEST_F(ServerTest, NewerSchemaIsRefusedAndEveryRequestAnswersStorageFailure)
+// A refused file stays byte for byte as it was: no tables, WAL switch or version.
+TEST_F(ServerTest, OpenInitialisesAnEmptyFileAndLeavesFilesNotOursUntouched)
 {
-    server.reset();
-    {
-        QSqlDatabase db = QSqlDatabase::addDatabase("QSQLITE", "newer");
-        db.setDatabaseName(path());
-        ASSERT_TRUE(db.open() && QSqlQuery(db).exec("PRAGMA user_version=2"));
+    const std::pair<QStringList, QString> files[] = {
+        {{}, ""},
+        {{"CREATE TABLE tmcard (id)", "PRAGMA user_version=2"},
+         ": schema version 2, this server knows 1"},
+        {{"CREATE TABLE t (x)", "INSERT INTO t VALUES (1)"},
+         ": not a time card database: it holds tables of another kind"},
+    };
+    for (const auto &[statements, reason] : files) {
+        const QString file = dir.filePath(QString("file%1.db").arg(reason.size()));
+        runSql(file, statements);
+        QFile bytes(file);
+        const QByteArray before =
+            bytes.open(QIODevice::ReadOnly | QIODevice::Unbuffered) ? bytes.readAll() : "";
+        RecordingServer opened(file);
+        EXPECT_EQ(opened.open().reason, reason.isEmpty() ? "" : file + reason);
+        EXPECT_EQ(opened.dump(),
+                  reason.isEmpty() ? cards(kDefault) : refusal(8, "database not open"));
+        EXPECT_EQ(bytes.seek(0) && bytes.readAll() == before, !reason.isEmpty());
     }
-    QSqlDatabase::removeDatabase("newer");
-    RecordingServer newer(path());
-    EXPECT_EQ(newer.open().reason, path() + ": schema version 2, this server knows 1");
-    EXPECT_EQ(newer.handle("DelTmcard", "<DelTmcard/>").content, refusal(8, "database not open"));
 }
 
-const QString kNested =
-    cards("<Tmcard><Revision>3</Revision><TmcardID>5</TmcardID><Name>Lobby</Name><Mapping><Ele>"
-          "<DayList><Ele B=\"1.0\"/></DayList><Motion></Motion></Ele></Mapping><CamList><Cam>"
-          "<Name>C_1</Name><GrpID>2</GrpID></Cam></CamList></Tmcard>");
-
-// The plug-in sends a time card cut from a read answer back as an update,
-// in whatever layout the server answered; a dump seeds the same state.
-TEST_F(ServerTest, AnswerLayoutsAreReadBack)
+// The child opens the file as a user who may not write it (root may write any file).
+TEST_F(ServerTest, ReadOnlyFileIsRefusedPlainly)
 {
-    const std::pair<AnswerLayout, QString> layouts[] = {
-        {AnswerLayout::Indented,
-         "<GetRecTmcardRes>\n  <Tmcard>\n    <Revision>3</Revision>\n    <TmcardID>5</TmcardID>\n"
-         "    <Name>Lobby</Name>\n    <Mapping>\n      <Ele>\n        <DayList>\n"
-         "          <Ele B=\"1.0\"/>\n        </DayList>\n        <Motion></Motion>\n      </Ele>\n"
-         "    </Mapping>\n    <CamList>\n      <Cam>\n        <Name>C_1</Name>\n"
-         "        <GrpID>2</GrpID>\n      </Cam>\n    </CamList>\n  "
-         "</Tmcard>\n</GetRecTmcardRes>\n"},
-        {AnswerLayout::Crlf,
-         "<GetRecTmcardRes>\r\n<Tmcard>\r\n<Revision>3</Revision>\r\n<TmcardID>5</TmcardID>\r\n"
-         "<Name>Lobby</Name>\r\n<Mapping>\r\n<Ele>\r\n<DayList>\r\n<Ele "
-         "B=\"1.0\"/>\r\n</DayList>\r\n"
-         "<Motion></Motion>\r\n</Ele>\r\n</Mapping>\r\n<CamList>\r\n<Cam>\r\n<Name>C_1</Name>\r\n"
-         "<GrpID>2</GrpID>\r\n</Cam>\r\n</CamList>\r\n</Tmcard>\r\n</GetRecTmcardRes>\r\n"},
+    ASSERT_EQ(chmod(qPrintable(path()), 0444) + chmod(qPrintable(dir.path()), 0755), 0);
+    GTEST_FLAG_SET(death_test_style, "fast");
+    EXPECT_EXIT(
+        {
+            if (getuid() == 0 && (setgid(65534) != 0 || setuid(65534) != 0))
+                _exit(2);
+            std::cerr << RecordingServer(path()).open().reason.toStdString();
+            _exit(0);
+        },
+        testing::ExitedWithCode(0), "db: the file is read-only, and the server writes to it$");
+}
+
+TEST_F(ServerTest, OfTwoWritersInsertingOneFixedNameAtOnceOneIsRefused)
+{
+    std::atomic<int> ready{0};
+    const auto write = [&] {
+        RecordingServer writer(path());
+        writer.open();
+        for (++ready; ready < 2;)
+            std::this_thread::yield();
+        return writer.handle("InsRecTmcard", insert(tag("Name", kEvent) + "<Mapping/>")).code;
     };
-    for (const auto &[layout, expected] : layouts) {
-        SCOPED_TRACE(static_cast<int>(layout));
-        ASSERT_EQ(ask("seed", kNested).code, "0");
-        server->setLayout(layout);
-        const QString read = server->dump();
-        EXPECT_EQ(read.toStdString(), expected.toStdString());
-        EXPECT_EQ(ask("seed", read).code, "0");
-        const qsizetype from = read.indexOf("<Tmcard>");
-        const QString card = read.mid(from, read.indexOf("</Tmcard>") + 9 - from);
-        EXPECT_EQ(ask("UpdRecTmcard", tag("UpdRecTmcard", card)).code, "0");
-        server->setLayout(AnswerLayout::Compact);
-        EXPECT_EQ(server->dump(), QString(kNested).replace("<Revision>3<", "<Revision>4<"));
-    }
+    auto first = std::async(std::launch::async, write);
+    auto second = std::async(std::launch::async, write);
+    const QString codes = first.get() + second.get();
+    EXPECT_TRUE(codes == "09" || codes == "90") << codes.toStdString();
+    EXPECT_EQ(server->dump().count(tag("Name", kEvent)), 1);
 }
 
 } // namespace

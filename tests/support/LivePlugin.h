@@ -21,6 +21,7 @@ public:
     LivePlugin();
     // Replaces the server's time cards with those of a "GetRecTmcardRes" text.
     void seed(const QString &getRecTmcardRes);
+    QString databasePath() const { return m_dir.filePath(QStringLiteral("server.db")); }
     // The server's answer to a read of all time cards.
     QString dump();
     // The one reply, after every exchange it started; none or a second fails the test.
