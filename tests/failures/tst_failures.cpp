@@ -227,6 +227,104 @@ INSTANTIATE_TEST_SUITE_P(Chains, Walk, ::testing::ValuesIn(rows()), [](const aut
            FaultNames[int(info.param.fault)];
 });
 
+// Another request created the fixed time card between this one's read and
+// its insert, so the server refuses the insert with code 9. The cameras then
+// go onto the time card that won (8, holding C_6), once; before, the request
+// failed and the cameras were on no time card.
+enum class AfterRefusal { WinnerRead, ReadFails, WinnerGone, UpdateRefused };
+
+struct RaceRow
+{
+    const char *name;
+    QString command;
+    QVariantMap payload;
+    QString winner; // the fixed name
+    AfterRefusal after;
+    QStringList sent;
+    QString code;
+};
+
+void PrintTo(const RaceRow &row, std::ostream *os)
+{
+    *os << row.name;
+}
+
+class LostRace : public ::testing::TestWithParam<RaceRow>
+{};
+
+TEST_P(LostRace, CamerasGoOntoTheTimeCardThatWonOnce)
+{
+    const RaceRow &row = GetParam();
+    Site site(TestTunnel::Delivery::Held);
+    bool refused = false;
+    site.tunnel.setResponder([&](const TestTunnel::Sent &sent) -> TestTunnel::Answer {
+        if (sent.command == u"InsRecTmcard") {
+            refused = true;
+            return {true, u"9"_s, u"<Error>exists</Error>"_s};
+        }
+        if (sent.command == u"UpdRecTmcard")
+            return {true, row.after == AfterRefusal::UpdateRefused ? u"7"_s : u"0"_s, {}};
+        if (refused && row.after == AfterRefusal::ReadFails)
+            return {false, {}, {}, true};
+        TestTunnel::Answer answer = serverAnswer(sent);
+        if (refused && row.after != AfterRefusal::WinnerGone)
+            answer.content.replace(u"</GetRecTmcardRes>"_s,
+                                   u"<Tmcard><Revision>3</Revision><TmcardID>8</TmcardID><Name>%1"
+                                   "</Name><Mapping/><CamList><Cam><Name>C_6</Name><GrpID>1</GrpID>"
+                                   "</Cam></CamList></Tmcard></GetRecTmcardRes>"_s.arg(row.winner));
+        return answer;
+    });
+    site.plugin->Request(row.command, row.payload, {}, site.replies.replyFunction(1));
+    site.tunnel.deliverAll();
+
+    EXPECT_EQ(site.tunnel.commands(), row.sent);
+    ASSERT_EQ(site.replies.replyCount(1), 1);
+    EXPECT_EQ(site.replies.waitForFirst(1, {})->code, row.code);
+    if (row.after == AfterRefusal::WinnerRead) {
+        const QString update = site.tunnel.sent().last().body;
+        EXPECT_TRUE(update.contains(
+            u"<Revision>3</Revision><TmcardID>8</TmcardID><Name>%1</Name>"_s.arg(row.winner)))
+            << update.toStdString();
+        EXPECT_TRUE(
+            update.contains(u"<CamList><Cam><Name>C_2</Name><RecGrpID>1</RecGrpID></Cam>"
+                            "<Cam><Name>C_6</Name><RecGrpID>1</RecGrpID></Cam></CamList>"_s))
+            << update.toStdString();
+    }
+}
+
+const QString ContinuousName = u"KOLT2 Default Continuous Recording"_s;
+const QVariantMap ContinuousC2{{u"camRecGroupList"_s, cameras(u"C_2"_s)}};
+const QStringList Joined{u"GetRecTmcard"_s, u"InsRecTmcard"_s, u"GetRecTmcard"_s,
+                         u"UpdRecTmcard"_s};
+const QStringList ReadAgain{u"GetRecTmcard"_s, u"InsRecTmcard"_s, u"GetRecTmcard"_s};
+
+INSTANTIATE_TEST_SUITE_P(
+    Chains, LostRace,
+    ::testing::Values(
+        RaceRow{"default_continuous_joins_the_winner", u"DefaultContinousSchedule"_s, ContinuousC2,
+                ContinuousName, AfterRefusal::WinnerRead, Joined, u"0"_s},
+        RaceRow{"minus_3_joins_the_winner",
+                u"UpdateCamRecSchedule"_s,
+                {{u"scheduleAddCam"_s, entry(u"-3"_s, u"C_2"_s)}},
+                ContinuousName,
+                AfterRefusal::WinnerRead,
+                Joined,
+                u"0"_s},
+        RaceRow{"customised_joins_the_winner",
+                u"CustomizeSchedule"_s,
+                {{u"timeframes"_s, Weekdays}, {u"camRecGroupList"_s, cameras(u"C_2"_s)}},
+                u"KOLT2 Customize Recording"_s,
+                AfterRefusal::WinnerRead,
+                Joined,
+                u"0"_s},
+        RaceRow{"failed_second_read_fails_the_request", u"DefaultContinousSchedule"_s, ContinuousC2,
+                ContinuousName, AfterRefusal::ReadFails, ReadAgain, u"-1"_s},
+        RaceRow{"winner_deleted_meanwhile_fails_the_request", u"DefaultContinousSchedule"_s,
+                ContinuousC2, ContinuousName, AfterRefusal::WinnerGone, ReadAgain, u"-1"_s},
+        RaceRow{"refused_update_of_the_winner_is_not_tried_again", u"DefaultContinousSchedule"_s,
+                ContinuousC2, ContinuousName, AfterRefusal::UpdateRefused, Joined, u"-1"_s}),
+    [](const auto &info) { return std::string(info.param.name); });
+
 // What the host's thread does while every chain runs on several plug-ins,
 // each on a tunnel answering on its own thread and fed by two requester
 // threads. Every request writes its requester's identity into the control,
