@@ -8,6 +8,7 @@
 #include <gtest/gtest.h>
 
 #include <limits>
+#include <tuple>
 
 namespace {
 
@@ -69,6 +70,11 @@ const QString Read3 = "<GetRecTmcard><TmcardID>3</TmcardID></GetRecTmcard>";
 const QString Three = "<CamList><Cam><Name>C_1</Name><GrpID>1</GrpID></Cam><Cam><Name>C_2</Name><GrpID>2</GrpID></Cam><Cam><Name>C_3</Name><GrpID>3</GrpID></Cam></CamList>";
 const QString Kept13 = "<CamList><Cam><Name>C_1</Name><RecGrpID>1</RecGrpID></Cam><Cam><Name>C_3</Name><RecGrpID>3</RecGrpID></Cam></CamList>";
 const QString New9 = "<CamList><Cam><Name>C_9</Name><RecGrpID>4</RecGrpID></Cam></CamList>";
+// Another request created the default continuous time card (2, with C_6) first.
+const QString Taken = "RecordingSettingControl::HdlrTunnelReqCallback, HdlrTunnelReqCallback failed: success:1, reqRespCode:9";
+const QString ReadAll = "<GetRecTmcard><TmcardAll>true</TmcardAll></GetRecTmcard>";
+const QString Won = "<GetRecTmcardRes><Tmcard><Revision>5</Revision><TmcardID>2</TmcardID><Name>KOLT2 Default Continuous Recording</Name><Mapping/><CamList><Cam><Name>C_6</Name><GrpID>1</GrpID></Cam></CamList></Tmcard></GetRecTmcardRes>";
+const QString C2 = "<CamList><Cam><Name>C_2</Name><RecGrpID>1</RecGrpID></Cam></CamList>";
 QString answer(const QString &cameraList, const QString &after = {}) { return "<GetRecTmcardRes>" + Head + cameraList + after + "</Tmcard></GetRecTmcardRes>"; }
 QString back(const QString &cameraList, const QString &after = {}) { return "<UpdRecTmcard>" + Head + cameraList + after + "</Tmcard></UpdRecTmcard>"; }
 // clang-format on
@@ -93,6 +99,8 @@ struct Row
     QString heard = {};  // what the completion heard: "", "ok" or "failed"
     QString record = {}; // the last error record
     QString answer = {}; // the server's answer to the first exchange
+    QString code = "0";  // its result code
+    QString then = {};   // the answer to the second exchange
     friend void PrintTo(const Row &row, std::ostream *out) { *out << row.name; }
 };
 
@@ -105,7 +113,9 @@ TEST_P(Messages, GoOutExactlyAsWritten)
     TestLog log;
     log.attach();
     TestTunnel tunnel; // answers at once; an empty completion must not be called
-    tunnel.queueAnswer({true, "0", row.answer, true});
+    tunnel.queueAnswer({true, row.code, row.answer, true});
+    if (!row.then.isEmpty())
+        tunnel.queueAnswer({true, "0", row.then, true});
     Done done;
     EXPECT_EQ(row.send(*makeControl(&tunnel), done), !row.bodies.isEmpty());
     QString bodies;
@@ -142,6 +152,9 @@ INSTANTIATE_TEST_SUITE_P(Operations, Messages, testing::Values(
     Row{"quotes_carriage_return_and_characters_XML_cannot_carry", [](auto &c, Done &) { return c.AddSchedule(QString("'a\"\r") + QChar(1) + QChar(0xD800), "{}", {}); }, insert("&apos;a&quot;&#13;" + QString(2, QChar(0xFFFD)), "")},
     Row{"schedule_update_escapes_every_text_fills_markers_once_and_keeps_cameras_as_given", [](auto &c, Done &) { return c.UpdateSchedule("5'", "2\"", "50%1 off %2", "{}", {camera("C&1", "<3>"), camera("C&1", "<3>")}, {}); }, R"(<UpdRecTmcard><Tmcard><Revision>5&apos;</Revision><TmcardID>2&quot;</TmcardID><Name>50%1 off %2</Name><Mapping></Mapping><CamList>)" R"(<Cam><Name>C&amp;1</Name><RecGrpID>&lt;3&gt;</RecGrpID></Cam><Cam><Name>C&amp;1</Name><RecGrpID>&lt;3&gt;</RecGrpID></Cam></CamList></Tmcard></UpdRecTmcard>)"},
     Row{"customised_time_card_without_cameras_has_no_camera_list", [](auto &c, Done &) { return c.CreateCustomizeTimecard("{}", {}, {}); }, insert("KOLT2 Customize Recording", "")},
+    // The insert refused with code 9 once failed the request, its cameras on no time card.
+    Row{"fixed_time_card_created_meanwhile_gets_the_cameras_by_one_update", [](auto &c, Done &d) { return c.CreateDefaultContinuousTimecard({camera("C_2", "1")}, d.take()); }, insert("KOLT2 Default Continuous Recording", always("Continuous"), C2) + ReadAll + update("KOLT2 Default Continuous Recording", always("Continuous"), "<CamList><Cam><Name>C_2</Name><RecGrpID>1</RecGrpID></Cam><Cam><Name>C_6</Name><RecGrpID>1</RecGrpID></Cam></CamList>"), "ok", Taken, {}, "9", Won},
+    Row{"fixed_time_card_gone_again_by_the_second_read_is_not_created_again", [](auto &c, Done &d) { return c.CreateDefaultContinuousTimecard({camera("C_2", "1")}, d.take()); }, insert("KOLT2 Default Continuous Recording", always("Continuous"), C2) + ReadAll, "failed", Taken, {}, "9", "<GetRecTmcardRes/>"},
     Row{"default_event_time_card", [](auto &c, Done &) { return c.CreateDefaultEventTimecard({}, {}); }, insert("KOLT2 Default Event Recording", always("Event"))},
     Row{"camera_given_and_present_stands_once_as_given", [](auto &c, Done &) { return c.UpdateDefaultEventTimecard({{"Revision", "5"}, {"TmcardID", "2"}, {"CamList", QList<QVariant>{camera("C_1", "1"), camera("C_2", "1")}}}, {camera("C_1", "4")}, {}); }, update("KOLT2 Default Event Recording", always("Event"), "<CamList><Cam><Name>C_1</Name><RecGrpID>4</RecGrpID></Cam><Cam><Name>C_2</Name><RecGrpID>1</RecGrpID></Cam></CamList>")},
     Row{"lone_present_camera_is_read_as_a_list_of_one", [](auto &c, Done &) { return c.UpdateDefaultContinuousTimecard({{"Revision", "5"}, {"TmcardID", "2"}, {"CamList", camera("C_5", "5")}}, {}, {}); }, update("KOLT2 Default Continuous Recording", always("Continuous"), "<CamList><Cam><Name>C_5</Name><RecGrpID>5</RecGrpID></Cam></CamList>")},
@@ -276,22 +289,13 @@ INSTANTIATE_TEST_SUITE_P(EveryOperation, SendPath, testing::Values(
 // counted in int, which overflows from 1,073,742 cameras on.
 TEST(CameraTimeOut, GrowsWithTheCamerasAndSaturates)
 {
-    const struct
-    {
-        const char *name;
-        qint64 cameras;
-        int ms;
-    } rows[] = {
-        {"no cameras get the least time-out", 0, 15000},
-        {"a negative count gets the least time-out", -5, 15000},
+    const std::tuple<const char *, qint64, int> rows[] = {
+        {"no cameras, or a negative count, get the least time-out", -5, 15000},
         {"eight cameras get 2000 ms each", 8, 16000},
-        {"1,073,741 cameras still fit", 1073741, 2147482000},
         {"1,073,742 cameras saturate instead of wrapping", 1073742, 2147483647},
-        {"the largest count saturates", std::numeric_limits<qint64>::max(), 2147483647},
-    };
-    for (const auto &row : rows)
-        EXPECT_EQ(PluginRecordingScheduleSettingCommon::Timeout::forCameras(row.cameras), row.ms)
-            << row.name;
+        {"the largest count saturates", std::numeric_limits<qint64>::max(), 2147483647}};
+    for (const auto &[name, cameras, ms] : rows)
+        EXPECT_EQ(PluginRecordingScheduleSettingCommon::Timeout::forCameras(cameras), ms) << name;
 }
 
 } // namespace
