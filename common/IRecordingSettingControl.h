@@ -29,6 +29,10 @@ public:
     virtual bool GetScheduleTimecardInfoById(int timecardId, TimecardListCallback done) = 0;
     virtual bool RemoveTimecardCameraList(int timecardId, const QList<QVariant> &cameras,
                                           ControlResultCallback done) = 0;
+    // The three Create operations make a fixed time card the server does not
+    // hold yet. When another request created it meanwhile (the insert refused
+    // with code 9), the cameras go onto that time card instead: read again,
+    // then updated once; the completion hears the outcome of that update.
     virtual bool CreateDefaultContinuousTimecard(const QList<QVariant> &cameras,
                                                  ControlResultCallback done) = 0;
     virtual bool UpdateDefaultContinuousTimecard(const QMap<QString, QVariant> &summary,

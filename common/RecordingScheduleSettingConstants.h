@@ -5,6 +5,9 @@
 
 #include <QString>
 
+#include <algorithm>
+#include <limits>
+
 namespace PluginRecordingScheduleSettingCommon {
 
 // The plug-in's identity; also the plug-in identifier of every tunnel send.
@@ -53,6 +56,12 @@ namespace ResultCode {
 inline const QString Success = QStringLiteral("0");
 inline const QString Failure = QStringLiteral("-1");
 } // namespace ResultCode
+
+// Response codes of the recording server that the plug-in acts on.
+namespace ServerResponse {
+// An insert refused: a time card of one of the fixed names exists already.
+inline const QString FixedNameTaken = QStringLiteral("9");
+} // namespace ServerResponse
 
 // The recording server's time card commands.
 namespace TunnelCommand {
@@ -124,8 +133,8 @@ inline const QString UpdateTimecard = QStringLiteral(
     "<UpdRecTmcard><Tmcard><Revision>%1</Revision><TmcardID>%2</TmcardID><Name>%3</Name>"
     "<Mapping>%4</Mapping>%5</Tmcard></UpdRecTmcard>");
 inline const QString UpdateTimecardText = QStringLiteral("<UpdRecTmcard>%1</UpdRecTmcard>");
-inline const QString DeleteTimecard = QStringLiteral(
-    "<DelTmcard><Revision>%1</Revision><TmcardID>%2</TmcardID></DelTmcard>");
+inline const QString DeleteTimecard =
+    QStringLiteral("<DelTmcard><Revision>%1</Revision><TmcardID>%2</TmcardID></DelTmcard>");
 inline const QString Camera = QStringLiteral("<Cam><Name>%1</Name><RecGrpID>%2</RecGrpID></Cam>");
 inline const QString CameraList = QStringLiteral("<CamList>%1</CamList>");
 inline const QString MappingElement = QStringLiteral("<Ele>%1<RecMode>%2</RecMode>%3</Ele>");
@@ -159,6 +168,15 @@ inline const QString DefaultEventMapping = QStringLiteral(
 namespace Timeout {
 constexpr int Minimum = 15000;
 constexpr int PerCamera = 2000;
+
+// PerCamera for each camera, never below Minimum. Counted in 64 bits and held
+// to the int range: a count of cameras times 2000 in int overflows from
+// 1,073,742 cameras on.
+constexpr int forCameras(qint64 cameras)
+{
+    const qint64 total = qint64(PerCamera) * std::clamp<qint64>(cameras, 0, qint64(1) << 32);
+    return int(std::clamp<qint64>(total, Minimum, std::numeric_limits<int>::max()));
+}
 } // namespace Timeout
 
 } // namespace PluginRecordingScheduleSettingCommon

@@ -62,8 +62,7 @@ TimecardListCallback changeAfterRead(const LifetimeGuard &guard, const ResponseC
             changed.remove(cameras);
         else
             changed.merge(cameras);
-        const int timeoutMs =
-            Timeout::PerCamera * static_cast<int>(removing ? held : changed.entries().size());
+        const int timeoutMs = Timeout::forCameras(removing ? held : changed.entries().size());
         const QSharedPointer<IRecordingSettingControl> control = guard.control();
         if (!control ||
             !control->UpdateTimecardCameraList(answer, changed.entries(), step, timeoutMs))

@@ -5,9 +5,6 @@
 #include "TimecardTemplate.h"
 #include "TraceLog.h"
 
-#include <algorithm>
-#include <limits>
-
 using namespace PluginRecordingScheduleSettingCommon;
 
 namespace {
@@ -71,13 +68,6 @@ RecordingSettingControl::~RecordingSettingControl() = default;
 void RecordingSettingControl::SetClientID(void *const clientId)
 {
     m_clientId.store(clientId);
-}
-
-int RecordingSettingControl::CameraTimeout(qsizetype cameras)
-{
-    const qint64 perCamera = qint64(Timeout::PerCamera) * std::max<qsizetype>(cameras, 0);
-    return static_cast<int>(
-        std::clamp<qint64>(perCamera, Timeout::Minimum, std::numeric_limits<int>::max()));
 }
 
 bool RecordingSettingControl::Send(const QString &command, const QString &body, int timeoutMs,

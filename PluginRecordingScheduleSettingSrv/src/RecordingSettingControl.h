@@ -76,8 +76,6 @@ private:
     TunnelResponseHandler BindResult(ControlResultCallback done);
     TunnelResponseHandler BindTimecardList(TimecardListCallback done);
     TunnelResponseHandler BindTimecardId(TimecardIdCallback done);
-    // 2000 ms per camera, never below 15000.
-    static int CameraTimeout(qsizetype cameras);
 
     // Answer handlers (the six tunnel values, then the caller's completion).
     void HdlrTunnelReqCallback(bool ok, const QString &status, const QString &detail,
@@ -111,6 +109,11 @@ private:
     bool InsertFixedTimecard(const FixedSchedule &fixed, const QString &content,
                              const QList<QVariant> &cameras, bool perCamera,
                              ControlResultCallback done);
+    // After the server refused the insert because another request created
+    // the fixed time card first: all time cards read again and the cameras
+    // put on the one that won, once. done hears the outcome of that update.
+    void JoinFixedTimecard(const FixedSchedule &fixed, const QString &content,
+                           const QList<QVariant> &cameras, bool flag, ControlResultCallback done);
     // Updated with the given cameras first, then the time card's own, each
     // camera once.
     bool UpdateFixedTimecard(const FixedSchedule &fixed, const QMap<QString, QVariant> &summary,

@@ -14,12 +14,19 @@ void PluginRecordingScheduleSettingSrv::HandleAddSchedule(const QVariant &payloa
                                                           ResponseCallback reply)
 {
     const QVariantMap map = payload.toMap();
+    const QString content = map.value(PayloadKey::Timeframes).toString();
+    // Without a name or a readable document the server would store a
+    // nameless time card with no time frames. A document without rectangles
+    // stays a schedule of its own: an empty one.
+    if (!map.contains(PayloadKey::ScheduleName) || !ClientInput::timeframes(content)) {
+        replyFailure(reply);
+        return;
+    }
     const QSharedPointer<IRecordingSettingControl> control = m_lifetime.control();
     const bool sent =
         control &&
         control->AddSchedule(
-            map.value(PayloadKey::ScheduleName).toString(),
-            map.value(PayloadKey::Timeframes).toString(),
+            map.value(PayloadKey::ScheduleName).toString(), content,
             m_lifetime.bind(reply, [this, reply](bool ok, bool flag, const QString &timecardId) {
                 HdlrAddScheduleCallback(ok, flag, timecardId, reply);
             }));

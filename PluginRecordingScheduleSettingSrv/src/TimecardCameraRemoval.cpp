@@ -68,8 +68,8 @@ void RecordingSettingControl::HdlrRmvDefTimecardCameraList(bool ok, bool flag,
     // The completion travels in the update's handler; a copy answers the
     // caller when the tunnel refuses the update, which would otherwise leave
     // the caller waiting for ever.
-    if (!Send(TunnelCommand::UpdRecTmcard, body, CameraTimeout(removal.size()), Identity::Tunnel,
-              BindResult(done)))
+    if (!Send(TunnelCommand::UpdRecTmcard, body, Timeout::forCameras(removal.size()),
+              Identity::Tunnel, BindResult(done)))
         fail();
 }
 

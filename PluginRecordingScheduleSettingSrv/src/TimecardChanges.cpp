@@ -38,9 +38,37 @@ bool RecordingSettingControl::InsertFixedTimecard(const FixedSchedule &fixed,
     const QString body =
         filled(Template::InsertTimecard,
                {fixed.timecardName, MappingOf(fixed, content), ComposeCamRecGrpListMsg(held)});
+    // Refused with FixedNameTaken, the request lost a race with another one
+    // that created the time card between its read and this insert.
+    TunnelResponseHandler handler = [this, &fixed, content, held, done = std::move(done)](
+                                        bool ok, const QString &status, const QString &detail,
+                                        const QString &code, const QString &answer, bool flag) {
+        ControlResultCallback then = done;
+        if (ok && code == ServerResponse::FixedNameTaken && done)
+            then = [this, &fixed, content, held, done](bool, bool refusedFlag) {
+                JoinFixedTimecard(fixed, content, held, refusedFlag, done);
+            };
+        HdlrTunnelReqCallback(ok, status, detail, code, answer, flag, then);
+    };
     return Send(TunnelCommand::InsRecTmcard, body,
-                perCamera ? CameraTimeout(held.size()) : Timeout::Minimum, Identity::Tunnel,
-                BindResult(std::move(done)));
+                perCamera ? Timeout::forCameras(held.size()) : Timeout::Minimum, Identity::Tunnel,
+                std::move(handler));
+}
+
+void RecordingSettingControl::JoinFixedTimecard(const FixedSchedule &fixed, const QString &content,
+                                                const QList<QVariant> &cameras, bool flag,
+                                                ControlResultCallback done)
+{
+    const auto join = [this, &fixed, content, cameras, done](bool ok, bool readFlag,
+                                                             const QList<QVariant> &timecards,
+                                                             const QString &) {
+        const QMap<QString, QVariant> winner =
+            ok ? GetTimecardInfoByName(timecards, fixed.timecardName) : QMap<QString, QVariant>();
+        if (winner.isEmpty() || !UpdateFixedTimecard(fixed, winner, content, cameras, done))
+            done(false, readFlag);
+    };
+    if (!GetAllScheduleTimecardInfo(join))
+        done(false, flag);
 }
 
 bool RecordingSettingControl::CreateCustomizeTimecard(const QString &content,
@@ -75,7 +103,7 @@ bool RecordingSettingControl::UpdateSchedule(const QString &revision, const QStr
         filled(Template::UpdateTimecard,
                {escaped(revision), escaped(timecardId), escaped(name),
                 ComposeScheRecTimeframeMsg(content), ComposeCamRecGrpListMsg(cameras)});
-    return Send(TunnelCommand::UpdRecTmcard, body, CameraTimeout(cameras.size()),
+    return Send(TunnelCommand::UpdRecTmcard, body, Timeout::forCameras(cameras.size()),
                 Identity::Requester, BindResult(std::move(done)));
 }
 

@@ -29,6 +29,7 @@ const QString RecordingStateNormalKey = QStringLiteral("recordingStateNormal");
 constexpr int FirstDay = 1;
 constexpr int LastDay = 7;
 constexpr double SecondsPerHour = 3600.0;
+constexpr double HoursPerDay = 24.0;
 
 // Saturated: a cast of NaN or of a value beyond the int range is undefined.
 int saturatedInt(double value)
@@ -64,6 +65,14 @@ double numberOf(const QJsonValue &value)
     return value.toVariant().toDouble();
 }
 
+// A rectangle is an object with a mode. Anything else (null, a number, a
+// text, an empty object) would become a time frame with no mode.
+bool isRectangle(const QJsonValue &entry)
+{
+    const QJsonValue mode = entry.toObject().value(DocKey::RecordingMode);
+    return mode.isString() && !mode.toString().isEmpty();
+}
+
 } // namespace
 
 QString RecordingSettingControl::ComposeScheRecTimeframeMsg(const QString &content) const
@@ -82,6 +91,8 @@ QString RecordingSettingControl::ComposeScheRecTimeframeMsg(const QString &conte
     QString interval;
     bool sized = false;
     for (const QJsonValue entry : list) {
+        if (!isRectangle(entry))
+            continue;
         const QJsonObject rectangle = entry.toObject();
         frame.clear();
         days = ComposeDayListMsg(integerOf(rectangle.value(DocKey::Left)),
@@ -90,7 +101,7 @@ QString RecordingSettingControl::ComposeScheRecTimeframeMsg(const QString &conte
                                       numberOf(rectangle.value(DocKey::Bottom)));
         TimecardTemplate::appendFilled(frame, Template::Frame,
                                        {Template::CustomizeFrameName, days, interval});
-        const QString mode = rectangle.value(DocKey::RecordingMode).toVariant().toString();
+        const QString mode = rectangle.value(DocKey::RecordingMode).toString();
         const QString triggers =
             mode == RecordingMode::Event
                 ? ComposeTriggerEventsMsg(
@@ -160,12 +171,17 @@ QString RecordingSettingControl::ComposeDayListMsg(int first, int last) const
 
 QString RecordingSettingControl::ComposeIntervalMsg(double beginHours, double endHours) const
 {
+    // Held to the day: a Bottom of 24.5 would otherwise end past midnight,
+    // and one of 1e308 would read back as hour 596523.
+    const auto seconds = [](double hours) {
+        return saturatedInt(std::clamp(std::isnan(hours) ? 0.0 : hours, 0.0, HoursPerDay) *
+                            SecondsPerHour);
+    };
     // Rounded to the nearest second: the document's hours carry six
     // significant digits, and truncation would move 00:20:00 to 00:19:59 on
     // every read and save.
-    return TimecardTemplate::filled(Template::IntervalEntry,
-                                    {QString::number(saturatedInt(beginHours * SecondsPerHour)),
-                                     QString::number(saturatedInt(endHours * SecondsPerHour))});
+    return TimecardTemplate::filled(Template::IntervalEntry, {QString::number(seconds(beginHours)),
+                                                              QString::number(seconds(endHours))});
 }
 
 QString RecordingSettingControl::ComposeCamRecGrpListMsg(const QList<QVariant> &cameras) const

@@ -1,11 +1,14 @@
 // RecordingSettingControl through its interface, against a scripted tunnel: the bytes
 // sent for given inputs, the requests made, and the one completion each operation gives.
+#include "RecordingScheduleSettingConstants.h"
 #include "RecordingSettingControl.h"
 #include "TestLog.h"
 #include "TestTunnel.h"
 
 #include <gtest/gtest.h>
 
+#include <limits>
+#include <tuple>
 
 namespace {
 
@@ -46,7 +49,7 @@ using Send = std::function<bool(IRecordingSettingControl &, Done &)>;
 const QString Removal = "RecordingSettingControl::HdlrRmvDefTimecardCameraList, HdlrRmvDefTimecardCameraList failed.";
 const QString Period = "<Range><Period><TmS>2016-03-29 00:00:00.000</TmS><TmE>2035-01-01 00:00:00.000</TmE></Period><End>false</End></Range><RepeatFreq>1</RepeatFreq>";
 const QString Zero = R"(<Ele B="0" E="0"/>)";
-const QString NoMode = "<RecMode></RecMode>";
+const QString Continuous = "<RecMode>Continuous</RecMode>";
 const QString Event = "<RecMode>Event</RecMode><Motion>0</Motion><ContMotNum>1</ContMotNum>";
 // The 29 plain trigger elements after DigiInput, none of them set.
 const QString Rest = "<PIR>0</PIR><Tampering>0</Tampering><PPTZTrigger>0</PPTZTrigger><StopUntilDIFalling>0</StopUntilDIFalling><StopUntilDIRising>0</StopUntilDIRising><LineDetection>0</LineDetection><FieldDetection>0</FieldDetection><Loitering>0</Loitering><CrowdDetection>0</CrowdDetection><MissingObject>0</MissingObject><AbandonObject>0</AbandonObject><FaceDetection>0</FaceDetection><ZoneDetection>0</ZoneDetection><SmartTracking>0</SmartTracking><RunningDetection>0</RunningDetection><ParkingViolationDetection>0</ParkingViolationDetection><RestrictedZoneDetection>0</RestrictedZoneDetection><TemperatureThresholdWarning>0</TemperatureThresholdWarning><TemperatureThresholdAlarm>0</TemperatureThresholdAlarm><TemperatureDifferenceWarning>0</TemperatureDifferenceWarning><TemperatureDifferenceAlarm>0</TemperatureDifferenceAlarm><TemperatureRiseWarning>0</TemperatureRiseWarning><TemperatureRiseAlarm>0</TemperatureRiseAlarm><TemperatureSectionAlarm>0</TemperatureSectionAlarm><ThermalIntrusion>0</ThermalIntrusion><ThermalMultiLoitering>0</ThermalMultiLoitering><FireSpotDetection>0</FireSpotDetection><SmokerDetection>0</SmokerDetection><SmokeAndFlameDetection>0</SmokeAndFlameDetection>";
@@ -67,15 +70,22 @@ const QString Read3 = "<GetRecTmcard><TmcardID>3</TmcardID></GetRecTmcard>";
 const QString Three = "<CamList><Cam><Name>C_1</Name><GrpID>1</GrpID></Cam><Cam><Name>C_2</Name><GrpID>2</GrpID></Cam><Cam><Name>C_3</Name><GrpID>3</GrpID></Cam></CamList>";
 const QString Kept13 = "<CamList><Cam><Name>C_1</Name><RecGrpID>1</RecGrpID></Cam><Cam><Name>C_3</Name><RecGrpID>3</RecGrpID></Cam></CamList>";
 const QString New9 = "<CamList><Cam><Name>C_9</Name><RecGrpID>4</RecGrpID></Cam></CamList>";
+// Another request created the default continuous time card (2, with C_6) first.
+const QString Taken = "RecordingSettingControl::HdlrTunnelReqCallback, HdlrTunnelReqCallback failed: success:1, reqRespCode:9";
+const QString ReadAll = "<GetRecTmcard><TmcardAll>true</TmcardAll></GetRecTmcard>";
+const QString Won = "<GetRecTmcardRes><Tmcard><Revision>5</Revision><TmcardID>2</TmcardID><Name>KOLT2 Default Continuous Recording</Name><Mapping/><CamList><Cam><Name>C_6</Name><GrpID>1</GrpID></Cam></CamList></Tmcard></GetRecTmcardRes>";
+const QString C2 = "<CamList><Cam><Name>C_2</Name><RecGrpID>1</RecGrpID></Cam></CamList>";
 QString answer(const QString &cameraList, const QString &after = {}) { return "<GetRecTmcardRes>" + Head + cameraList + after + "</Tmcard></GetRecTmcardRes>"; }
 QString back(const QString &cameraList, const QString &after = {}) { return "<UpdRecTmcard>" + Head + cameraList + after + "</Tmcard></UpdRecTmcard>"; }
 // clang-format on
 
-// AddSchedule "S" with one rectangle of these fields, or with this document.
+// AddSchedule "S" with one rectangle of these fields (recording "Continuous"
+// unless they name a mode), or with this document.
 Send add(const QString &fields)
 {
+    const QString mode = fields.contains("RecordingMode") ? "" : R"("RecordingMode":"Continuous",)";
     const QString document =
-        fields.startsWith('{') ? fields : R"({"Rectangles":[{)" + fields + "}]}";
+        fields.startsWith('{') ? fields : R"({"Rectangles":[{)" + mode + fields + "}]}";
     return [document](IRecordingSettingControl &c, Done &) {
         return c.AddSchedule("S", document, {});
     };
@@ -89,6 +99,8 @@ struct Row
     QString heard = {};  // what the completion heard: "", "ok" or "failed"
     QString record = {}; // the last error record
     QString answer = {}; // the server's answer to the first exchange
+    QString code = "0";  // its result code
+    QString then = {};   // the answer to the second exchange
     friend void PrintTo(const Row &row, std::ostream *out) { *out << row.name; }
 };
 
@@ -101,7 +113,9 @@ TEST_P(Messages, GoOutExactlyAsWritten)
     TestLog log;
     log.attach();
     TestTunnel tunnel; // answers at once; an empty completion must not be called
-    tunnel.queueAnswer({true, "0", row.answer, true});
+    tunnel.queueAnswer({true, row.code, row.answer, true});
+    if (!row.then.isEmpty())
+        tunnel.queueAnswer({true, "0", row.then, true});
     Done done;
     EXPECT_EQ(row.send(*makeControl(&tunnel), done), !row.bodies.isEmpty());
     QString bodies;
@@ -116,14 +130,15 @@ TEST_P(Messages, GoOutExactlyAsWritten)
 
 // clang-format off
 INSTANTIATE_TEST_SUITE_P(Operations, Messages, testing::Values(
-    Row{"day_six_to_seven_is_day_seven", add(R"("Left":6,"Right":7)"), insert("S", ele(R"(<Ele B="7.0"/>)", Zero, NoMode))},
-    Row{"equal_bounds_give_no_day", add(R"("Left":3,"Right":3)"), insert("S", ele("", Zero, NoMode))},
-    Row{"days_before_the_week_start_at_day_one", add(R"("Left":-5,"Right":2)"), insert("S", ele(R"(<Ele B="1.0"/><Ele B="2.0"/>)", Zero, NoMode))},
-    Row{"days_after_the_week_stop_at_day_seven", add(R"("Left":5,"Right":2000000000)"), insert("S", ele(R"(<Ele B="6.0"/><Ele B="7.0"/>)", Zero, NoMode))},
-    Row{"bounds_beyond_the_int_range_saturate", add(R"("Left":-1e300,"Right":1e300)"), insert("S", ele(R"(<Ele B="1.0"/><Ele B="2.0"/><Ele B="3.0"/><Ele B="4.0"/><Ele B="5.0"/><Ele B="6.0"/><Ele B="7.0"/>)", Zero, NoMode))},
-    Row{"quarter_hours_and_the_end_of_the_day", add(R"("Top":8.25,"Bottom":24)"), insert("S", ele("", R"(<Ele B="29700" E="86400"/>)", NoMode))},
-    Row{"six_digit_hours_round_to_the_nearest_second", add(R"("Top":0.333333,"Bottom":23.9997)"), insert("S", ele("", R"(<Ele B="1200" E="86399"/>)", NoMode))},
-    Row{"hours_beyond_the_int_range_saturate", add(R"("Top":-1e300,"Bottom":1e300)"), insert("S", ele("", R"(<Ele B="-2147483648" E="2147483647"/>)", NoMode))},
+    Row{"day_six_to_seven_is_day_seven", add(R"("Left":6,"Right":7)"), insert("S", ele(R"(<Ele B="7.0"/>)", Zero, Continuous))},
+    Row{"equal_bounds_give_no_day", add(R"("Left":3,"Right":3)"), insert("S", ele("", Zero, Continuous))},
+    Row{"days_before_the_week_start_at_day_one", add(R"("Left":-5,"Right":2)"), insert("S", ele(R"(<Ele B="1.0"/><Ele B="2.0"/>)", Zero, Continuous))},
+    Row{"days_after_the_week_stop_at_day_seven", add(R"("Left":5,"Right":2000000000)"), insert("S", ele(R"(<Ele B="6.0"/><Ele B="7.0"/>)", Zero, Continuous))},
+    Row{"bounds_beyond_the_int_range_saturate", add(R"("Left":-1e300,"Right":1e300)"), insert("S", ele(R"(<Ele B="1.0"/><Ele B="2.0"/><Ele B="3.0"/><Ele B="4.0"/><Ele B="5.0"/><Ele B="6.0"/><Ele B="7.0"/>)", Zero, Continuous))},
+    Row{"quarter_hours_and_the_end_of_the_day", add(R"("Top":8.25,"Bottom":24)"), insert("S", ele("", R"(<Ele B="29700" E="86400"/>)", Continuous))},
+    Row{"six_digit_hours_round_to_the_nearest_second", add(R"("Top":0.333333,"Bottom":23.9997)"), insert("S", ele("", R"(<Ele B="1200" E="86399"/>)", Continuous))},
+    Row{"hours_beyond_the_int_range_are_held_to_the_day", add(R"("Top":-1e300,"Bottom":1e300)"), insert("S", ele("", R"(<Ele B="0" E="86400"/>)", Continuous))},
+    Row{"hours_past_the_day_are_held_to_it", add(R"("Top":-0.5,"Bottom":24.5)"), insert("S", ele("", R"(<Ele B="0" E="86400"/>)", Continuous))},
     Row{"every_trigger_key_sets_its_element", add(R"("RecordingMode":"Event","triggerEvents":)" + EveryKey), insert("S", ele("", Zero, "<RecMode>Event</RecMode><Motion>1</Motion><ContMotNum>1</ContMotNum><DigiInput>3</DigiInput>" + QString(Rest).replace(">0<", ">1<")))},
     Row{"digital_input_on_its_trigger_state", add(R"("RecordingMode":"Event","triggerEvents":{"di":true,"traditional":true,"recordingStateTrigger":true})"), insert("S", ele("", Zero, Event + "<DigiInput>1</DigiInput>" + Rest))},
     Row{"digital_input_on_its_normal_state", add(R"("RecordingMode":"Event","triggerEvents":{"di":true,"traditional":true,"recordingStateNormal":true})"), insert("S", ele("", Zero, Event + "<DigiInput>2</DigiInput>" + Rest))},
@@ -131,12 +146,15 @@ INSTANTIATE_TEST_SUITE_P(Operations, Messages, testing::Values(
     Row{"only_the_exact_mode_Event_gets_triggers", add(R"("RecordingMode":"event","triggerEvents":{"motion":true})"), insert("S", ele("", Zero, "<RecMode>event</RecMode>"))},
     Row{"event_without_trigger_events_gets_none", add(R"("RecordingMode":"Event")"), insert("S", ele("", Zero, "<RecMode>Event</RecMode>")), {}, "trigget events map is empty"},
     Row{"two_rectangles_give_two_frames_in_order", add(R"({"Rectangles":[{"RecordingMode":"B"},{"RecordingMode":"A"}]})"), insert("S", ele("", Zero, "<RecMode>B</RecMode>") + ele("", Zero, "<RecMode>A</RecMode>"))},
-    Row{"entry_that_is_not_an_object_is_an_empty_frame", add(R"({"Rectangles":[7]})"), insert("S", ele("", Zero, NoMode))},
+    Row{"entries_that_are_not_rectangles_with_a_mode_are_skipped", add(R"({"Rectangles":[null,1,"a",{},{"RecordingMode":""},{"RecordingMode":7},{"Right":1,"RecordingMode":"A"}]})"), insert("S", ele(R"(<Ele B="1.0"/>)", Zero, "<RecMode>A</RecMode>"))},
     Row{"document_that_is_not_JSON_sends_no_frame", add("{Rectangles"), insert("S", ""), {}, "Time frames parse error. {Rectangles"},
     Row{"name_and_mode_are_escaped", [](auto &c, Done &) { return c.AddSchedule("A</Name><TmcardID>5</TmcardID><Name>B & co", R"({"Rectangles":[{"RecordingMode":"<R&D>"}]})", {}); }, insert("A&lt;/Name&gt;&lt;TmcardID&gt;5&lt;/TmcardID&gt;&lt;Name&gt;B &amp; co", ele("", Zero, "<RecMode>&lt;R&amp;D&gt;</RecMode>"))},
     Row{"quotes_carriage_return_and_characters_XML_cannot_carry", [](auto &c, Done &) { return c.AddSchedule(QString("'a\"\r") + QChar(1) + QChar(0xD800), "{}", {}); }, insert("&apos;a&quot;&#13;" + QString(2, QChar(0xFFFD)), "")},
     Row{"schedule_update_escapes_every_text_fills_markers_once_and_keeps_cameras_as_given", [](auto &c, Done &) { return c.UpdateSchedule("5'", "2\"", "50%1 off %2", "{}", {camera("C&1", "<3>"), camera("C&1", "<3>")}, {}); }, R"(<UpdRecTmcard><Tmcard><Revision>5&apos;</Revision><TmcardID>2&quot;</TmcardID><Name>50%1 off %2</Name><Mapping></Mapping><CamList>)" R"(<Cam><Name>C&amp;1</Name><RecGrpID>&lt;3&gt;</RecGrpID></Cam><Cam><Name>C&amp;1</Name><RecGrpID>&lt;3&gt;</RecGrpID></Cam></CamList></Tmcard></UpdRecTmcard>)"},
     Row{"customised_time_card_without_cameras_has_no_camera_list", [](auto &c, Done &) { return c.CreateCustomizeTimecard("{}", {}, {}); }, insert("KOLT2 Customize Recording", "")},
+    // The insert refused with code 9 once failed the request, its cameras on no time card.
+    Row{"fixed_time_card_created_meanwhile_gets_the_cameras_by_one_update", [](auto &c, Done &d) { return c.CreateDefaultContinuousTimecard({camera("C_2", "1")}, d.take()); }, insert("KOLT2 Default Continuous Recording", always("Continuous"), C2) + ReadAll + update("KOLT2 Default Continuous Recording", always("Continuous"), "<CamList><Cam><Name>C_2</Name><RecGrpID>1</RecGrpID></Cam><Cam><Name>C_6</Name><RecGrpID>1</RecGrpID></Cam></CamList>"), "ok", Taken, {}, "9", Won},
+    Row{"fixed_time_card_gone_again_by_the_second_read_is_not_created_again", [](auto &c, Done &d) { return c.CreateDefaultContinuousTimecard({camera("C_2", "1")}, d.take()); }, insert("KOLT2 Default Continuous Recording", always("Continuous"), C2) + ReadAll, "failed", Taken, {}, "9", "<GetRecTmcardRes/>"},
     Row{"default_event_time_card", [](auto &c, Done &) { return c.CreateDefaultEventTimecard({}, {}); }, insert("KOLT2 Default Event Recording", always("Event"))},
     Row{"camera_given_and_present_stands_once_as_given", [](auto &c, Done &) { return c.UpdateDefaultEventTimecard({{"Revision", "5"}, {"TmcardID", "2"}, {"CamList", QList<QVariant>{camera("C_1", "1"), camera("C_2", "1")}}}, {camera("C_1", "4")}, {}); }, update("KOLT2 Default Event Recording", always("Event"), "<CamList><Cam><Name>C_1</Name><RecGrpID>4</RecGrpID></Cam><Cam><Name>C_2</Name><RecGrpID>1</RecGrpID></Cam></CamList>")},
     Row{"lone_present_camera_is_read_as_a_list_of_one", [](auto &c, Done &) { return c.UpdateDefaultContinuousTimecard({{"Revision", "5"}, {"TmcardID", "2"}, {"CamList", camera("C_5", "5")}}, {}, {}); }, update("KOLT2 Default Continuous Recording", always("Continuous"), "<CamList><Cam><Name>C_5</Name><RecGrpID>5</RecGrpID></Cam></CamList>")},
@@ -265,5 +283,19 @@ INSTANTIATE_TEST_SUITE_P(EveryOperation, SendPath, testing::Values(
     Operation{"camera_list_update_with_a_longer_time_out", "UpdRecTmcard 40000 requester", Result, {}, [](auto &c, Done &d) { return c.UpdateTimecardCameraList(answer(Three), {}, d.take(), 40000); }}),
     [](const auto &op) { return op.param.name; });
 // clang-format on
+
+// The time-out of a send that goes through the cameras of a time card, for
+// the control and the camera-assignment workflow alike. The workflow once
+// counted in int, which overflows from 1,073,742 cameras on.
+TEST(CameraTimeOut, GrowsWithTheCamerasAndSaturates)
+{
+    const std::tuple<const char *, qint64, int> rows[] = {
+        {"no cameras, or a negative count, get the least time-out", -5, 15000},
+        {"eight cameras get 2000 ms each", 8, 16000},
+        {"1,073,742 cameras saturate instead of wrapping", 1073742, 2147483647},
+        {"the largest count saturates", std::numeric_limits<qint64>::max(), 2147483647}};
+    for (const auto &[name, cameras, ms] : rows)
+        EXPECT_EQ(PluginRecordingScheduleSettingCommon::Timeout::forCameras(cameras), ms) << name;
+}
 
 } // namespace
