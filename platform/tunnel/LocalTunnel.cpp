@@ -53,7 +53,8 @@ struct LocalTunnel::State
 {
     LocalTunnelOptions options;
     FaultPlan faults;
-    ExchangeLog log;
+    // Shared, so that a caller can ask about it after the tunnel is gone.
+    const std::shared_ptr<ExchangeLog> log = std::make_shared<ExchangeLog>();
     void *ownIdentity = nullptr;
 
     std::mutex mutex;
@@ -123,7 +124,7 @@ LocalTunnel::LocalTunnel(TunnelBackendFactory factory, LocalTunnelOptions option
     }
     state.faults.setSeed(state.options.faultSeed);
     if (!state.options.exchangeLogPath.isEmpty()) {
-        if (std::optional<QString> error = state.log.open(state.options.exchangeLogPath)) {
+        if (std::optional<QString> error = state.log->open(state.options.exchangeLogPath)) {
             state.error = *error;
             return;
         }
@@ -240,7 +241,7 @@ void LocalTunnel::State::carryOut(quint64 seq, const TunnelBackend &backend,
         late.code = answer.code;
         late.content = answer.content;
         lock.unlock();
-        log.write(late);
+        log->write(late);
         lock.lock();
         return;
     }
@@ -289,7 +290,7 @@ void LocalTunnel::State::deliver(Entry &entry, bool ok, const QString &code, con
     entry.record.content = content;
     entry.record.outcome = outcome;
     entry.record.elapsedMs = millisecondsSince(entry.accepted);
-    log.write(entry.record);
+    log->write(entry.record);
     try {
         entry.handler(ok, QString(), QString(), code, content, entry.record.flag);
     } catch (...) {
@@ -408,7 +409,7 @@ bool LocalTunnel::SendRequest(const QString &pluginId, void *clientId, int kind,
     if (entry.faults.refuse) {
         lock.unlock();
         entry.record.outcome = QStringLiteral("refused");
-        state.log.write(entry.record);
+        state.log->write(entry.record);
         return false;
     }
     entry.held = entry.faults.reorder;
@@ -448,6 +449,11 @@ bool LocalTunnel::waitIdle(std::chrono::milliseconds timeout)
     State &state = *m_state;
     std::unique_lock<std::mutex> lock(state.mutex);
     return state.changed.wait_for(lock, timeout, [&] { return state.idle(); });
+}
+
+std::shared_ptr<const ExchangeLog> LocalTunnel::exchangeLog() const
+{
+    return m_state->log;
 }
 
 std::optional<QString> LocalTunnel::faultTextError(const QString &text)

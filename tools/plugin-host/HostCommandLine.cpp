@@ -173,9 +173,10 @@ HostResult<HostOptions> readOptions(const HostParser &host, HostOptions options)
     const HostResult<qint64> client =
         clientId ? HostResult<qint64>(*clientId)
                  : Failure{QStringLiteral("--client takes a whole number from 0 to 2^53")};
-    const HostResult<qint64> level = traced ? wholeNumber(parser.value(host.traceLevel), 0, 255,
-                                                      "--trace-level takes a level from 0 to 255")
-                                        : HostResult<qint64>(0);
+    const HostResult<qint64> level = traced
+                                         ? wholeNumber(parser.value(host.traceLevel), 0, 255,
+                                                       "--trace-level takes a level from 0 to 255")
+                                         : HostResult<qint64>(0);
     // In this order: the first mistake is the one reported.
     for (const HostResult<qint64> *number : {&seed, &timeout, &client, &level}) {
         if (!*number)
@@ -191,7 +192,8 @@ HostResult<HostOptions> readOptions(const HostParser &host, HostOptions options)
 
 } // namespace
 
-HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app)
+HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app,
+                                             const QByteArrayList &rawArguments)
 {
     HostParser host;
     if (!host.parser.parse(app.arguments()))
@@ -203,5 +205,8 @@ HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app)
     HostResult<HostOptions> command = readCommand(host.parser.positionalArguments());
     if (!command)
         return command;
+    // Everything from the command word on is positional: the arguments are
+    // the last ones given.
+    command->rawArguments = rawArguments.mid(rawArguments.size() - command->arguments.size());
     return readOptions(host, std::move(*command));
 }
