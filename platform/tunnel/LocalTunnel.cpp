@@ -3,6 +3,8 @@
 #include "ExchangeLog.h"
 #include "FaultPlan.h"
 
+#include <QThread>
+
 #include <chrono>
 #include <condition_variable>
 #include <deque>
@@ -115,6 +117,12 @@ TunnelBackendFactory recordingServerBackend(const QString &databasePath, AnswerL
 LocalTunnel::LocalTunnel(TunnelBackendFactory factory, LocalTunnelOptions options)
     : m_state(std::make_unique<State>())
 {
+    // Qt takes the first thread that asks for its thread data for the
+    // application's main thread. Were that the backend thread (its database
+    // connection is a QObject), Qt would keep the backend's thread data as
+    // the main thread's, and the real main thread's, made later, would never
+    // be freed. So the thread that makes the tunnel asks first.
+    QThread::currentThread();
     State &state = *m_state;
     state.options = std::move(options);
     state.ownIdentity = static_cast<IKoltTunnelClient *>(this);

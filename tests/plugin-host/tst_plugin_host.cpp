@@ -45,27 +45,10 @@ const std::vector<std::pair<QString, QString>> Places = {
 };
 
 // Arguments pass through QProcess as text, so bytes that are not UTF-8 are
-// written \xNN and made by the shell's printf ("%b" reads \0NNN, octal).
-const QRegularExpression EscapedByte(uR"(\\x([0-9A-Fa-f]{2}))"_s);
+// written \xNN and made by bash's printf.
+const QRegularExpression EscapedByte(uR"(\\x[0-9A-Fa-f]{2})"_s);
 const char *const ShellBytes =
     R"sh(p=$1; shift; n=$#; for w; do set -- "$@" "$(printf '%b' "$w")"; done; shift $n; exec "$p" "$@")sh";
-
-QStringList octalEscapes(QStringList words)
-{
-    for (QString &word : words) {
-        QString octal;
-        qsizetype from = 0;
-        for (auto it = EscapedByte.globalMatch(word); it.hasNext();) {
-            const QRegularExpressionMatch match = it.next();
-            octal +=
-                word.mid(from, match.capturedStart() - from) + u"\\0"_s +
-                QString::number(match.captured(1).toUInt(nullptr, 16), 8).rightJustified(3, u'0');
-            from = match.capturedEnd();
-        }
-        word = octal + word.mid(from);
-    }
-    return words;
-}
 
 class HostRun
 {
@@ -89,9 +72,9 @@ public:
                         m_dir.filePath(u"exchanges.jsonl"_s)} +
             given;
         if (arguments.contains(EscapedByte))
-            process.start(u"/bin/sh"_s, QStringList{u"-c"_s, QString::fromUtf8(ShellBytes), u"sh"_s,
-                                                    QStringLiteral(PLUGIN_HOST_FILE)} +
-                                            octalEscapes(all));
+            process.start(u"/bin/bash"_s, QStringList{u"-c"_s, QString::fromUtf8(ShellBytes),
+                                                      u"sh"_s, QStringLiteral(PLUGIN_HOST_FILE)} +
+                                              all);
         else
             process.start(QStringLiteral(PLUGIN_HOST_FILE), all);
         process.write(input.toUtf8());

@@ -54,8 +54,9 @@ Commands:
 Each reply is one JSON line on standard output:
   {"command": NAME, "flag": B, "code": "0"|"-1", "text": T, "data": D}
 Exit status: 0 when every request got exactly one reply, whatever its code;
-3 when a request got no reply in time or more than one; 2 for usage errors,
-unreadable files, JSON that does not parse and a plug-in that does not load.
+3 when a request got no reply in time or more than one, or output could not
+be written; 2 for usage errors, unreadable files, JSON that does not parse, a
+plug-in that does not load and a dump the server refuses.
 Options go before the command.
 
 Faults (--faults) are comma-separated, e.g. "latency=50ms,refuse=0.1,fail@3";

@@ -33,17 +33,6 @@ HostResult<QByteArray> readInput(const QString &fileName)
     return file.readAll();
 }
 
-// Stops a platform that sent requests: an exchange log that missed a record
-// ends the run with ExitReplies unless it failed already.
-int stopPlatform(HostPlatform &platform, int status)
-{
-    const std::optional<Failure> failure = platform.stop();
-    if (!failure)
-        return status;
-    printError(failure->message);
-    return status == ExitOk ? ExitReplies : status;
-}
-
 int runRequests(const HostOptions &options, const std::vector<HostRequest> &requests)
 {
     HostPlatform platform(options);
@@ -136,6 +125,15 @@ private:
 constexpr std::chrono::milliseconds RawAnswerGrace{5000};
 
 } // namespace
+
+int stopPlatform(HostPlatform &platform, int status)
+{
+    const std::optional<Failure> failure = platform.stop();
+    if (!failure)
+        return status;
+    printError(failure->message);
+    return status == ExitOk ? ExitReplies : status;
+}
 
 int runHostCommand(const HostOptions &options)
 {
