@@ -16,6 +16,7 @@ ExchangeLog::~ExchangeLog()
 
 std::optional<QString> ExchangeLog::open(const QString &path)
 {
+    m_path = path;
     m_file = std::fopen(QFile::encodeName(path).constData(), "a");
     if (m_file)
         return std::nullopt;
@@ -48,6 +49,18 @@ void ExchangeLog::write(const ExchangeRecord &record)
     QByteArray line = QJsonDocument(object).toJson(QJsonDocument::Compact);
     line += '\n';
     const std::lock_guard<std::mutex> lock(m_mutex);
-    std::fwrite(line.constData(), 1, static_cast<std::size_t>(line.size()), m_file);
-    std::fflush(m_file);
+    const std::size_t size = static_cast<std::size_t>(line.size());
+    errno = 0;
+    const bool written =
+        std::fwrite(line.constData(), 1, size, m_file) == size && std::fflush(m_file) == 0;
+    if (!written && !m_writeFailure)
+        m_writeFailure =
+            QStringLiteral("exchange log %1: %2")
+                .arg(m_path, QString::fromLocal8Bit(std::strerror(errno != 0 ? errno : EIO)));
+}
+
+std::optional<QString> ExchangeLog::writeFailure() const
+{
+    const std::lock_guard<std::mutex> lock(m_mutex);
+    return m_writeFailure;
 }

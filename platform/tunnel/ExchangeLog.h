@@ -38,8 +38,13 @@ public:
     // Opens the file for appending; why it does not open, or nothing.
     std::optional<QString> open(const QString &path);
     void write(const ExchangeRecord &record);
+    // Why a record could not be written (the first time it failed), or
+    // nothing: a log missing exchanges must not pass for a complete one.
+    std::optional<QString> writeFailure() const;
 
 private:
-    std::mutex m_mutex;
+    mutable std::mutex m_mutex;
     std::FILE *m_file = nullptr;
+    QString m_path;
+    std::optional<QString> m_writeFailure;
 };

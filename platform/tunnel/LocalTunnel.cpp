@@ -3,6 +3,8 @@
 #include "ExchangeLog.h"
 #include "FaultPlan.h"
 
+#include <QThread>
+
 #include <chrono>
 #include <condition_variable>
 #include <deque>
@@ -53,7 +55,8 @@ struct LocalTunnel::State
 {
     LocalTunnelOptions options;
     FaultPlan faults;
-    ExchangeLog log;
+    // Shared, so that a caller can ask about it after the tunnel is gone.
+    const std::shared_ptr<ExchangeLog> log = std::make_shared<ExchangeLog>();
     void *ownIdentity = nullptr;
 
     std::mutex mutex;
@@ -114,6 +117,12 @@ TunnelBackendFactory recordingServerBackend(const QString &databasePath, AnswerL
 LocalTunnel::LocalTunnel(TunnelBackendFactory factory, LocalTunnelOptions options)
     : m_state(std::make_unique<State>())
 {
+    // Qt takes the first thread that asks for its thread data for the
+    // application's main thread. Were that the backend thread (its database
+    // connection is a QObject), Qt would keep the backend's thread data as
+    // the main thread's, and the real main thread's, made later, would never
+    // be freed. So the thread that makes the tunnel asks first.
+    QThread::currentThread();
     State &state = *m_state;
     state.options = std::move(options);
     state.ownIdentity = static_cast<IKoltTunnelClient *>(this);
@@ -123,7 +132,7 @@ LocalTunnel::LocalTunnel(TunnelBackendFactory factory, LocalTunnelOptions option
     }
     state.faults.setSeed(state.options.faultSeed);
     if (!state.options.exchangeLogPath.isEmpty()) {
-        if (std::optional<QString> error = state.log.open(state.options.exchangeLogPath)) {
+        if (std::optional<QString> error = state.log->open(state.options.exchangeLogPath)) {
             state.error = *error;
             return;
         }
@@ -240,7 +249,7 @@ void LocalTunnel::State::carryOut(quint64 seq, const TunnelBackend &backend,
         late.code = answer.code;
         late.content = answer.content;
         lock.unlock();
-        log.write(late);
+        log->write(late);
         lock.lock();
         return;
     }
@@ -289,7 +298,7 @@ void LocalTunnel::State::deliver(Entry &entry, bool ok, const QString &code, con
     entry.record.content = content;
     entry.record.outcome = outcome;
     entry.record.elapsedMs = millisecondsSince(entry.accepted);
-    log.write(entry.record);
+    log->write(entry.record);
     try {
         entry.handler(ok, QString(), QString(), code, content, entry.record.flag);
     } catch (...) {
@@ -408,7 +417,7 @@ bool LocalTunnel::SendRequest(const QString &pluginId, void *clientId, int kind,
     if (entry.faults.refuse) {
         lock.unlock();
         entry.record.outcome = QStringLiteral("refused");
-        state.log.write(entry.record);
+        state.log->write(entry.record);
         return false;
     }
     entry.held = entry.faults.reorder;
@@ -448,6 +457,11 @@ bool LocalTunnel::waitIdle(std::chrono::milliseconds timeout)
     State &state = *m_state;
     std::unique_lock<std::mutex> lock(state.mutex);
     return state.changed.wait_for(lock, timeout, [&] { return state.idle(); });
+}
+
+std::shared_ptr<const ExchangeLog> LocalTunnel::exchangeLog() const
+{
+    return m_state->log;
 }
 
 std::optional<QString> LocalTunnel::faultTextError(const QString &text)

@@ -11,6 +11,8 @@
 #include <memory>
 #include <optional>
 
+class ExchangeLog;
+
 // What the tunnel talks to: one request in, one answer out. Called only on
 // the tunnel's backend thread.
 using TunnelBackend = std::function<ServerAnswer(const QString &command, const QString &body)>;
@@ -91,6 +93,11 @@ public:
     // passed first.
     void waitIdle();
     bool waitIdle(std::chrono::milliseconds timeout);
+
+    // The exchange log (closed when no path was given). Destruction writes
+    // the last records, so hold it past the tunnel to ask whether every
+    // record was written.
+    std::shared_ptr<const ExchangeLog> exchangeLog() const;
 
     // Why a fault text does not parse; nothing when it does. Command lines
     // check their fault text with it before starting.

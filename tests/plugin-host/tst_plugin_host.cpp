@@ -44,6 +44,12 @@ const std::vector<std::pair<QString, QString>> Places = {
     {u"$DATA"_s, QStringLiteral(TEST_DATA_DIR)},
 };
 
+// Arguments pass through QProcess as text, so bytes that are not UTF-8 are
+// written \xNN and made by bash's printf.
+const QRegularExpression EscapedByte(uR"(\\x[0-9A-Fa-f]{2})"_s);
+const char *const ShellBytes =
+    R"sh(p=$1; shift; n=$#; for w; do set -- "$@" "$(printf '%b' "$w")"; done; shift $n; exec "$p" "$@")sh";
+
 class HostRun
 {
 public:
@@ -52,15 +58,25 @@ public:
     {
         for (const auto &[name, place] : Places)
             arguments.replace(name, place);
+        arguments.replace(u"$TMP"_s, m_dir.path());
         QProcess process;
         QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
         environment.insert(u"XDG_DATA_HOME"_s, m_dir.path());
         environment.remove(u"QIRNLOG_FILE"_s);
         process.setProcessEnvironment(environment);
-        process.start(QStringLiteral(PLUGIN_HOST_FILE),
-                      QStringList{u"--db"_s, m_dir.filePath(u"server.sqlite"_s), u"--exchanges"_s,
-                                  m_dir.filePath(u"exchanges.jsonl"_s)} +
-                          words(arguments));
+        QStringList given = words(arguments);
+        if (!given.isEmpty() && given.first().startsWith(u'>'))
+            process.setStandardOutputFile(given.takeFirst().mid(1));
+        const QStringList all =
+            QStringList{u"--db"_s, m_dir.filePath(u"server.sqlite"_s), u"--exchanges"_s,
+                        m_dir.filePath(u"exchanges.jsonl"_s)} +
+            given;
+        if (arguments.contains(EscapedByte))
+            process.start(u"/bin/bash"_s, QStringList{u"-c"_s, QString::fromUtf8(ShellBytes),
+                                                      u"sh"_s, QStringLiteral(PLUGIN_HOST_FILE)} +
+                                              all);
+        else
+            process.start(QStringLiteral(PLUGIN_HOST_FILE), all);
         process.write(input.toUtf8());
         process.closeWriteChannel();
         EXPECT_TRUE(process.waitForFinished(120000)) << arguments.toStdString();
@@ -74,6 +90,13 @@ public:
         for (const auto &[name, place] : Places)
             text.replace(place, name);
         return text;
+    }
+
+    // Copies data/NAME into the run's folder, where a run may change it.
+    void copy(const QString &name)
+    {
+        EXPECT_TRUE(QFile::copy(QStringLiteral(TEST_DATA_DIR "/") + name, m_dir.filePath(name)))
+            << name.toStdString();
     }
 
 private:
@@ -126,6 +149,13 @@ TEST_P(Transcript, PrintsExactlyWhatTheFileShows)
     HostRun run;
     QString actual;
     for (const QString &step : ('\n' + GetParam().text).split(u"\n$ "_s, Qt::SkipEmptyParts)) {
+        if (step.startsWith("\n+ "_L1)) { // "+ NAME" lines before the first run
+            for (const QString &line : step.mid(1).split(u'\n')) {
+                actual += line + u'\n';
+                run.copy(line.mid(2));
+            }
+            continue;
+        }
         const QStringList lines = step.split(u'\n');
         actual += "$ "_L1 + lines.first() + u'\n';
         QString input;

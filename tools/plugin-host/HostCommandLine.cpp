@@ -54,8 +54,9 @@ Commands:
 Each reply is one JSON line on standard output:
   {"command": NAME, "flag": B, "code": "0"|"-1", "text": T, "data": D}
 Exit status: 0 when every request got exactly one reply, whatever its code;
-3 when a request got no reply in time or more than one; 2 for usage errors,
-unreadable files, JSON that does not parse and a plug-in that does not load.
+3 when a request got no reply in time or more than one, or output could not
+be written; 2 for usage errors, unreadable files, JSON that does not parse, a
+plug-in that does not load and a dump the server refuses.
 Options go before the command.
 
 Faults (--faults) are comma-separated, e.g. "latency=50ms,refuse=0.1,fail@3";
@@ -173,9 +174,10 @@ HostResult<HostOptions> readOptions(const HostParser &host, HostOptions options)
     const HostResult<qint64> client =
         clientId ? HostResult<qint64>(*clientId)
                  : Failure{QStringLiteral("--client takes a whole number from 0 to 2^53")};
-    const HostResult<qint64> level = traced ? wholeNumber(parser.value(host.traceLevel), 0, 255,
-                                                      "--trace-level takes a level from 0 to 255")
-                                        : HostResult<qint64>(0);
+    const HostResult<qint64> level = traced
+                                         ? wholeNumber(parser.value(host.traceLevel), 0, 255,
+                                                       "--trace-level takes a level from 0 to 255")
+                                         : HostResult<qint64>(0);
     // In this order: the first mistake is the one reported.
     for (const HostResult<qint64> *number : {&seed, &timeout, &client, &level}) {
         if (!*number)
@@ -191,7 +193,8 @@ HostResult<HostOptions> readOptions(const HostParser &host, HostOptions options)
 
 } // namespace
 
-HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app)
+HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app,
+                                             const QByteArrayList &rawArguments)
 {
     HostParser host;
     if (!host.parser.parse(app.arguments()))
@@ -203,5 +206,8 @@ HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app)
     HostResult<HostOptions> command = readCommand(host.parser.positionalArguments());
     if (!command)
         return command;
+    // Everything from the command word on is positional: the arguments are
+    // the last ones given.
+    command->rawArguments = rawArguments.mid(rawArguments.size() - command->arguments.size());
     return readOptions(host, std::move(*command));
 }

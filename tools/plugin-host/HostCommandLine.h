@@ -2,6 +2,7 @@
 
 #include "HostResult.h"
 
+#include <QByteArrayList>
 #include <QString>
 #include <QStringList>
 
@@ -15,6 +16,9 @@ struct HostOptions
 {
     QString command;
     QStringList arguments;
+    // The same arguments as the bytes given: a payload is read from these,
+    // so that bytes that are not UTF-8 are refused, not made U+FFFD.
+    QByteArrayList rawArguments;
 
     QString pluginFile;
     QString databaseFile;
@@ -27,7 +31,9 @@ struct HostOptions
     std::optional<int> traceLevel;
 };
 
-// Reads the command line of the running application. --help and --version
+// Reads the command line of the running application, whose arguments as
+// given (argv) are rawArguments. --help and --version
 // print and end the process with status 0; any other mistake gives the
 // message for standard error.
-HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app);
+HostResult<HostOptions> parseHostCommandLine(const QCoreApplication &app,
+                                             const QByteArrayList &rawArguments);

@@ -13,6 +13,7 @@
 #include "Requesters.h"
 
 #include <QFile>
+#include <QXmlStreamReader>
 
 #include <chrono>
 #include <condition_variable>
@@ -41,7 +42,19 @@ int runRequests(const HostOptions &options, const std::vector<HostRequest> &requ
     }
     RequestRunner runner(platform);
     runner.run(requests);
-    return runner.finish();
+    return stopPlatform(platform, runner.finish());
+}
+
+// The reason an <Error> answer gives, or the whole answer when it has none.
+QString refusalReason(const QString &content)
+{
+    QXmlStreamReader xml(content);
+    while (!xml.atEnd()) {
+        if (xml.readNext() == QXmlStreamReader::StartElement &&
+            xml.name() == QLatin1String("Reason"))
+            return xml.readElementText();
+    }
+    return content.trimmed();
 }
 
 // Opens the server's database on this thread, for the commands that work on
@@ -113,6 +126,15 @@ constexpr std::chrono::milliseconds RawAnswerGrace{5000};
 
 } // namespace
 
+int stopPlatform(HostPlatform &platform, int status)
+{
+    const std::optional<Failure> failure = platform.stop();
+    if (!failure)
+        return status;
+    printError(failure->message);
+    return status == ExitOk ? ExitReplies : status;
+}
+
 int runHostCommand(const HostOptions &options)
 {
     const QString &command = options.command;
@@ -134,7 +156,7 @@ int runRequest(const HostOptions &options)
     HostRequest request;
     request.command = options.arguments.at(0);
     if (options.arguments.size() > 1) {
-        const HostResult<QJsonValue> payload = JsonValues::parse(options.arguments.at(1).toUtf8());
+        const HostResult<QJsonValue> payload = JsonValues::parse(options.rawArguments.at(1));
         if (!payload) {
             printError(QStringLiteral("PAYLOAD is not JSON: %1").arg(payload.error()));
             return ExitUsage;
@@ -189,7 +211,16 @@ int runDump(const HostOptions &options)
         printError(server.error());
         return ExitUsage;
     }
-    QByteArray text = (*server)->dump().toUtf8();
+    const ServerAnswer answer = (*server)->handle(
+        QStringLiteral("GetRecTmcard"),
+        QStringLiteral("<GetRecTmcard><TmcardAll>true</TmcardAll></GetRecTmcard>"));
+    // A refusal printed as the dump would pass for a server without time cards.
+    if (answer.code != QLatin1String("0")) {
+        printError(QStringLiteral("the server refused the dump: code %1: %2")
+                       .arg(answer.code, refusalReason(answer.content)));
+        return ExitUsage;
+    }
+    QByteArray text = answer.content.toUtf8();
     if (text.endsWith('\n'))
         text.chop(1);
     printLine(text);
@@ -226,5 +257,5 @@ int runRaw(const HostOptions &options)
         printError(QStringLiteral("%1 answers to one request").arg(answer.count()));
         return ExitReplies;
     }
-    return ExitOk;
+    return stopPlatform(platform, ExitOk);
 }

@@ -275,5 +275,5 @@ int runDemo(const HostOptions &options)
     const int status = story.finish();
     story.say(status == ExitOk ? QStringLiteral("Every request got exactly one reply.")
                                : QStringLiteral("Some request did not get exactly one reply."));
-    return status;
+    return stopPlatform(platform, status);
 }

@@ -1,5 +1,6 @@
 #include "HostPlatform.h"
 
+#include "ExchangeLog.h"
 #include "IPluginObjectBase.h"
 #include "LocalFrameworkTools.h"
 #include "LocalTunnel.h"
@@ -14,9 +15,18 @@ HostPlatform::HostPlatform(const HostOptions &options) : m_options(options)
 
 HostPlatform::~HostPlatform()
 {
+    stop();
+}
+
+std::optional<Failure> HostPlatform::stop()
+{
+    const std::shared_ptr<const ExchangeLog> log = m_tunnel ? m_tunnel->exchangeLog() : nullptr;
     m_library.reset();
     m_framework.reset();
     m_tunnel.reset();
+    if (const std::optional<QString> failure = log ? log->writeFailure() : std::nullopt)
+        return Failure{*failure};
+    return std::nullopt;
 }
 
 std::optional<Failure> HostPlatform::loadPlugin()

@@ -39,6 +39,9 @@ public:
     std::optional<Failure> initialisePlugin();
     // The three steps above, in order, up to the first that fails.
     std::optional<Failure> start();
+    // Deletes the plug-in object and stops the tunnel, which logs what was
+    // still on its way; why the exchange log missed a record, or nothing.
+    std::optional<Failure> stop();
 
     IPluginObjectBase *plugin() const;
     // The tunnel the plug-in is given; waitIdle() on it waits until every

@@ -4,15 +4,58 @@
 
 #include <QJsonObject>
 
-#include <cmath>
-
 namespace {
 
-constexpr double MaxClient = 9007199254740992.0; // 2^53
+constexpr qint64 MaxClient = qint64(1) << 53;
 
 const QString CommandKey = QStringLiteral("command");
 const QString PayloadKey = QStringLiteral("payload");
 const QString ClientKey = QStringLiteral("client");
+
+// One member of an object's JSON text: its key decoded, its value as written.
+struct Member
+{
+    QString key;
+    QByteArray value;
+};
+
+// The members at the top level of an object's JSON text, in the order
+// written, each key as often as it is given; the text is known to parse.
+std::vector<Member> membersOf(const QByteArray &object)
+{
+    std::vector<Member> members;
+    int depth = 0;
+    qsizetype keyStart = -1;
+    qsizetype keyEnd = -1;
+    qsizetype valueStart = -1;
+    for (qsizetype i = 0; i < object.size(); ++i) {
+        const char c = object.at(i);
+        if (c == '"') {
+            const qsizetype start = i;
+            for (++i; object.at(i) != '"'; ++i) {
+                if (object.at(i) == '\\')
+                    ++i; // the escaped character
+            }
+            if (depth == 1 && keyStart < 0) {
+                keyStart = start;
+                keyEnd = i + 1;
+            }
+        } else if (c == ':' && depth == 1) {
+            valueStart = i + 1;
+        } else if (c == '{' || c == '[') {
+            ++depth;
+        } else if (c == ',' || c == '}' || c == ']') {
+            if (depth == 1 && valueStart >= 0) {
+                members.push_back(
+                    {JsonValues::parse(object.mid(keyStart, keyEnd - keyStart))->toString(),
+                     object.mid(valueStart, i - valueStart).trimmed()});
+                keyStart = valueStart = -1;
+            }
+            depth -= c == ',' ? 0 : 1;
+        }
+    }
+    return members;
+}
 
 HostResult<HostRequest> readLine(const QByteArray &line)
 {
@@ -22,11 +65,22 @@ HostResult<HostRequest> readLine(const QByteArray &line)
     if (!value->isObject())
         return Failure{QStringLiteral("a request is a JSON object")};
     const QJsonObject object = value->toObject();
-    for (auto it = object.begin(); it != object.end(); ++it) {
+    // The object keeps the last of keys given twice; a second "command"
+    // would otherwise replace the first without a word.
+    const std::vector<Member> members = membersOf(line);
+    std::optional<QByteArray> clientText;
+    for (std::size_t i = 0; i < members.size(); ++i) {
+        for (std::size_t j = 0; j < i; ++j) {
+            if (members[j].key == members[i].key)
+                return Failure{QStringLiteral("key \"%1\" given twice").arg(members[i].key)};
+        }
+        const QString &key = members[i].key;
         // A misspelt key would otherwise send the request without what it
         // was meant to carry.
-        if (it.key() != CommandKey && it.key() != PayloadKey && it.key() != ClientKey)
-            return Failure{QStringLiteral("unknown key \"%1\"").arg(it.key())};
+        if (key != CommandKey && key != PayloadKey && key != ClientKey)
+            return Failure{QStringLiteral("unknown key \"%1\"").arg(key)};
+        if (key == ClientKey)
+            clientText = members[i].value;
     }
     HostRequest request;
     const QJsonValue command = object.value(CommandKey);
@@ -35,9 +89,10 @@ HostResult<HostRequest> readLine(const QByteArray &line)
     request.command = command.toString();
     if (object.contains(PayloadKey))
         request.payload = object.value(PayloadKey).toVariant();
-    if (object.contains(ClientKey)) {
-        const QJsonValue client = object.value(ClientKey);
-        request.client = client.isDouble() ? clientNumber(client.toDouble()) : std::nullopt;
+    if (clientText) {
+        // Read as written, as --client is: as a double, 2^53 + 1 would be
+        // rounded to 2^53.
+        request.client = clientNumber(QString::fromUtf8(*clientText));
         if (!request.client)
             return Failure{QStringLiteral("\"client\" must be a whole number from 0 to 2^53")};
     }
@@ -46,18 +101,11 @@ HostResult<HostRequest> readLine(const QByteArray &line)
 
 } // namespace
 
-std::optional<qint64> clientNumber(double value)
-{
-    if (!(value >= 0 && value <= MaxClient) || std::floor(value) != value)
-        return std::nullopt;
-    return static_cast<qint64>(value);
-}
-
 std::optional<qint64> clientNumber(const QString &text)
 {
     bool ok = false;
     const qint64 value = text.toLongLong(&ok);
-    if (!ok || value < 0 || value > static_cast<qint64>(MaxClient))
+    if (!ok || value < 0 || value > MaxClient)
         return std::nullopt;
     return value;
 }

@@ -19,13 +19,14 @@ struct HostRequest
     std::optional<qint64> client;
 };
 
-// Client numbers are whole numbers that JSON carries exactly: 0 to 2^53.
-std::optional<qint64> clientNumber(double value);
+// Client numbers are whole numbers that JSON carries exactly: 0 to 2^53,
+// written as whole numbers (no fraction, no exponent) in a session as on
+// the command line.
 std::optional<qint64> clientNumber(const QString &text);
 
 // Reads a session: JSON Lines, one object per line,
 // {"command": NAME, "payload": VALUE, "client": N}, "payload" and "client"
-// optional; blank lines are skipped. The whole text is checked before
+// optional, each key once; blank lines are skipped. The whole text is checked before
 // anything is sent, so a bad line sends nothing: the requests, or
 // "line N: reason".
 HostResult<std::vector<HostRequest>> readSession(const QByteArray &text);

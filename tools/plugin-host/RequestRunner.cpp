@@ -48,13 +48,16 @@ void RequestRunner::run(const std::vector<HostRequest> &requests)
 {
     for (std::size_t i = 0; i < requests.size(); ++i) {
         const std::optional<ReplyCollector::Reply> reply = send(requests[i]);
-        if (!reply) {
+        if (reply)
+            printLine(replyLine(requests[i].command, *reply));
+        // Without its reply, or with it lost on the way out, the caller
+        // cannot know what the next request would start from.
+        if (!reply || standardOutputFailure()) {
             if (i + 1 < requests.size())
                 printError(
                     QStringLiteral("%1 later request(s) not sent").arg(requests.size() - i - 1));
             return;
         }
-        printLine(replyLine(requests[i].command, *reply));
     }
 }
 

@@ -15,7 +15,8 @@ int main(int argc, char *argv[])
     QCoreApplication::setApplicationName(QStringLiteral("plugin-host"));
     QCoreApplication::setApplicationVersion(QStringLiteral(PLUGIN_HOST_VERSION));
 
-    const HostResult<HostOptions> options = parseHostCommandLine(app);
+    const HostResult<HostOptions> options =
+        parseHostCommandLine(app, QByteArrayList(argv, argv + argc));
     if (!options) {
         printError(options.error());
         return ExitUsage;
@@ -23,5 +24,11 @@ int main(int argc, char *argv[])
     // Before the plug-in loads: it opens the trace-log library as it loads.
     if (options->traceLevel)
         sendTraceToStandardError(*options->traceLevel);
-    return runHostCommand(*options);
+    const int status = runHostCommand(*options);
+    // A reply that never reached the reader is not a success.
+    if (const std::optional<QString> failure = standardOutputFailure()) {
+        printError(QStringLiteral("standard output: %1").arg(*failure));
+        return status == ExitOk ? ExitReplies : status;
+    }
+    return status;
 }
