@@ -12,8 +12,12 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <condition_variable>
 #include <cstdint>
+#include <future>
 #include <memory>
+#include <mutex>
 #include <thread>
 
 using namespace Qt::StringLiterals;
@@ -303,5 +307,140 @@ INSTANTIATE_TEST_SUITE_P(Chains, Concurrent,
                          ::testing::Values(Meanwhile::Nothing, Meanwhile::ReplaceControls,
                                            Meanwhile::DeletePlugins),
                          [](const auto &info) { return RunNames[int(info.param)]; });
+
+// What a host does inside its reply functions, which the plug-in calls on
+// the tunnel's threads (here: threads that take the held answers in turn).
+// Requests 1 to `asked` are "GetAllScheduleRecInfo" sent before any answer;
+// a row may ask more from inside a reply. Nothing may deadlock or cost a
+// request its one reply; a wait that would deadlock gives up after a while
+// and fails the row instead. Labelled "threads".
+struct Host
+{
+    using Inside = void (*)(Host &, int request);
+
+    Host(Site &site, Inside inside) : site(site), inside(inside) {}
+
+    Site &site;
+    const Inside inside;
+    std::thread helper;
+    std::mutex mutex;
+    std::condition_variable changed;
+    int replying = 0;
+    bool together = false; // two replies were running at one time
+    const std::chrono::steady_clock::time_point deadline =
+        std::chrono::steady_clock::now() + std::chrono::seconds(5);
+
+    void ask(int request)
+    {
+        site.plugin->Request(
+            u"GetAllScheduleRecInfo"_s, {}, {},
+            [this, request, record = site.replies.replyFunction(request)](
+                bool flag, const QString &code, const QString &text, const QVariant &data) {
+                record(flag, code, text, data);
+                inside(*this, request);
+            });
+    }
+    // Waits until two replies have been running at one time; false when the
+    // deadline passed first.
+    bool meetAnother()
+    {
+        std::unique_lock<std::mutex> lock(mutex);
+        together = together || ++replying >= 2;
+        changed.notify_all();
+        const bool met = changed.wait_until(lock, deadline, [this] { return together; });
+        --replying;
+        return met;
+    }
+};
+
+struct HostRow
+{
+    const char *name;
+    Host::Inside inside;
+    int asked;
+    int tunnelThreads;
+    std::vector<QString> codes; // the reply of request 1, 2, ...
+};
+
+void PrintTo(const HostRow &row, std::ostream *os)
+{
+    *os << row.name;
+}
+
+const HostRow HostRows[] = {
+    {"reply_asks_again_from_inside_the_reply",
+     [](Host &host, int request) {
+         if (request == 1)
+             host.ask(3);
+     },
+     2,
+     1,
+     {u"0"_s, u"0"_s, u"0"_s}},
+    {"reply_deletes_the_plugin_and_the_answer_after_it_comes_late",
+     [](Host &host, int request) {
+         if (request == 1)
+             host.site.plugin.reset();
+     },
+     2,
+     1,
+     {u"0"_s, u"-1"_s}},
+    {"reply_waits_until_a_request_on_another_thread_has_returned",
+     [](Host &host, int request) {
+         if (request != 1)
+             return;
+         std::promise<void> returned;
+         std::future<void> done = returned.get_future();
+         host.helper = std::thread([&host, returned = std::move(returned)]() mutable {
+             host.ask(3);
+             returned.set_value();
+         });
+         EXPECT_EQ(done.wait_until(host.deadline), std::future_status::ready)
+             << "Request on another thread blocked by the running reply";
+     },
+     2,
+     1,
+     {u"0"_s, u"0"_s, u"0"_s}},
+    {"answers_on_four_threads_are_translated_at_the_same_time",
+     [](Host &host, int) { EXPECT_TRUE(host.meetAnother()) << "answers handled one at a time"; }, 8,
+     4, std::vector<QString>(8, u"0"_s)},
+    {"reply_deletes_the_plugin_while_another_thread_answers",
+     [](Host &host, int request) {
+         EXPECT_TRUE(host.meetAnother()) << "answers handled one at a time";
+         if (request == 1)
+             host.site.plugin.reset();
+     },
+     2,
+     2,
+     {u"0"_s, u"0"_s}},
+};
+
+class HostReplies : public ::testing::TestWithParam<HostRow>
+{};
+
+TEST_P(HostReplies, NoDeadlockAndOneReplyEach)
+{
+    const HostRow &row = GetParam();
+    Site site(TestTunnel::Delivery::Held);
+    Host host(site, row.inside);
+    for (int n = 1; n <= row.asked; ++n)
+        host.ask(n);
+    std::vector<std::thread> tunnelThreads;
+    for (int t = 0; t < row.tunnelThreads; ++t)
+        tunnelThreads.emplace_back([&] { site.tunnel.deliverAll(); });
+    for (std::thread &thread : tunnelThreads)
+        thread.join();
+    if (host.helper.joinable())
+        host.helper.join();
+    site.tunnel.deliverAll(); // what was sent after the tunnel's threads ran dry
+
+    for (size_t i = 0; i < row.codes.size(); ++i) {
+        const int n = int(i) + 1;
+        ASSERT_EQ(site.replies.replyCount(n), 1) << "request " << n;
+        EXPECT_EQ(site.replies.waitForFirst(n, {})->code, row.codes[i]) << "request " << n;
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(Host, HostReplies, ::testing::ValuesIn(HostRows),
+                         [](const auto &info) { return std::string(info.param.name); });
 
 } // namespace
