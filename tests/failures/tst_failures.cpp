@@ -12,12 +12,10 @@
 
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <chrono>
-#include <condition_variable>
 #include <cstdint>
-#include <future>
 #include <memory>
-#include <mutex>
 #include <thread>
 
 using namespace Qt::StringLiterals;
@@ -308,110 +306,61 @@ INSTANTIATE_TEST_SUITE_P(Chains, Concurrent,
                                            Meanwhile::DeletePlugins),
                          [](const auto &info) { return RunNames[int(info.param)]; });
 
-// What a host does inside its reply functions, which the plug-in calls on
-// the tunnel's threads (here: threads that take the held answers in turn).
-// Requests 1 to `asked` are "GetAllScheduleRecInfo" sent before any answer;
-// a row may ask more from inside a reply. Nothing may deadlock or cost a
-// request its one reply; a wait that would deadlock gives up after a while
-// and fails the row instead. Labelled "threads".
+// Hosts that act inside their replies, which come on 1 or 2 threads taking the
+// held answers in turn (the test's own first); requests 1 and 2 ask
+// "GetAllScheduleRecInfo" before any answer. A wait that would deadlock gives
+// up after 5 s and fails the row. Labelled "threads".
 struct Host
 {
-    using Inside = void (*)(Host &, int request);
-
-    Host(Site &site, Inside inside) : site(site), inside(inside) {}
-
-    Site &site;
-    const Inside inside;
+    Site site{TestTunnel::Delivery::Held};
+    void (*inside)(Host &, int request) = nullptr;
     std::thread helper;
-    std::mutex mutex;
-    std::condition_variable changed;
-    int replying = 0;
-    bool together = false; // two replies were running at one time
+    std::atomic<int> counted = 0;
     const std::chrono::steady_clock::time_point deadline =
         std::chrono::steady_clock::now() + std::chrono::seconds(5);
 
-    void ask(int request)
+    void ask(int n)
     {
-        site.plugin->Request(
-            u"GetAllScheduleRecInfo"_s, {}, {},
-            [this, request, record = site.replies.replyFunction(request)](
-                bool flag, const QString &code, const QString &text, const QVariant &data) {
-                record(flag, code, text, data);
-                inside(*this, request);
-            });
+        site.plugin->Request(u"GetAllScheduleRecInfo"_s, {}, {},
+                             [this, n, record = site.replies.replyFunction(n)](auto... reply) {
+                                 record(reply...);
+                                 inside(*this, n);
+                             });
     }
-    // Waits until two replies have been running at one time; false when the
-    // deadline passed first.
-    bool meetAnother()
+    // Counts in and waits until another thread has counted in too.
+    bool joinedByAnother()
     {
-        std::unique_lock<std::mutex> lock(mutex);
-        together = together || ++replying >= 2;
-        changed.notify_all();
-        const bool met = changed.wait_until(lock, deadline, [this] { return together; });
-        --replying;
-        return met;
+        for (++counted; counted < 2 && std::chrono::steady_clock::now() < deadline;)
+            std::this_thread::yield();
+        return counted >= 2;
     }
 };
 
 struct HostRow
 {
     const char *name;
-    Host::Inside inside;
-    int asked;
     int tunnelThreads;
-    std::vector<QString> codes; // the reply of request 1, 2, ...
+    const char *codes; // the replies of requests 1, 2, ...
+    void (*inside)(Host &, int request);
+    friend void PrintTo(const HostRow &row, std::ostream *os) { *os << row.name; }
 };
 
-void PrintTo(const HostRow &row, std::ostream *os)
-{
-    *os << row.name;
-}
-
 const HostRow HostRows[] = {
-    {"reply_asks_again_from_inside_the_reply",
-     [](Host &host, int request) {
-         if (request == 1)
-             host.ask(3);
-     },
-     2,
-     1,
-     {u"0"_s, u"0"_s, u"0"_s}},
-    {"reply_deletes_the_plugin_and_the_answer_after_it_comes_late",
-     [](Host &host, int request) {
-         if (request == 1)
-             host.site.plugin.reset();
-     },
-     2,
-     1,
-     {u"0"_s, u"-1"_s}},
-    {"reply_waits_until_a_request_on_another_thread_has_returned",
-     [](Host &host, int request) {
-         if (request != 1)
-             return;
-         std::promise<void> returned;
-         std::future<void> done = returned.get_future();
-         host.helper = std::thread([&host, returned = std::move(returned)]() mutable {
-             host.ask(3);
-             returned.set_value();
-         });
-         EXPECT_EQ(done.wait_until(host.deadline), std::future_status::ready)
-             << "Request on another thread blocked by the running reply";
-     },
-     2,
-     1,
-     {u"0"_s, u"0"_s, u"0"_s}},
-    {"answers_on_four_threads_are_translated_at_the_same_time",
-     [](Host &host, int) { EXPECT_TRUE(host.meetAnother()) << "answers handled one at a time"; }, 8,
-     4, std::vector<QString>(8, u"0"_s)},
-    {"reply_deletes_the_plugin_while_another_thread_answers",
-     [](Host &host, int request) {
-         EXPECT_TRUE(host.meetAnother()) << "answers handled one at a time";
-         if (request == 1)
-             host.site.plugin.reset();
-     },
-     2,
-     2,
-     {u"0"_s, u"0"_s}},
+    {"reply_asks_again_from_inside_the_reply", 1, "0 0 0",
+     [](Host &host, int n) { n == 1 ? host.ask(3) : void(); }},
+    {"reply_deletes_the_plugin_and_the_answer_after_it_comes_late", 1, "0 -1",
+     [](Host &host, int n) { n == 1 ? host.site.plugin.reset() : void(); }},
+    {"reply_waits_until_a_request_on_another_thread_has_returned", 1, "0 0 0",
+     [](Host &host, int n) {
+         if (n == 1)
+             host.helper = std::thread([&host] { host.ask(3), ++host.counted; });
+         EXPECT_TRUE(n != 1 || host.joinedByAnother()) << "Request blocked by the reply";
+     }},
+    {"answers_on_two_threads_run_at_once_and_one_reply_deletes_the_plugin", 2, "0 0",
+     [](Host &host, int n) {
+         EXPECT_TRUE(host.joinedByAnother()) << "answers one at a time";
+         n == 1 ? host.site.plugin.reset() : void();
+     }},
 };
 
 class HostReplies : public ::testing::TestWithParam<HostRow>
@@ -419,24 +368,20 @@ class HostReplies : public ::testing::TestWithParam<HostRow>
 
 TEST_P(HostReplies, NoDeadlockAndOneReplyEach)
 {
-    const HostRow &row = GetParam();
-    Site site(TestTunnel::Delivery::Held);
-    Host host(site, row.inside);
-    for (int n = 1; n <= row.asked; ++n)
-        host.ask(n);
-    std::vector<std::thread> tunnelThreads;
-    for (int t = 0; t < row.tunnelThreads; ++t)
-        tunnelThreads.emplace_back([&] { site.tunnel.deliverAll(); });
-    for (std::thread &thread : tunnelThreads)
-        thread.join();
+    Host host;
+    host.inside = GetParam().inside;
+    host.ask(1), host.ask(2);
+    std::thread second(
+        [&] { GetParam().tunnelThreads == 2 ? host.site.tunnel.deliverAll() : void(); });
+    host.site.tunnel.deliverAll();
+    second.join();
     if (host.helper.joinable())
         host.helper.join();
-    site.tunnel.deliverAll(); // what was sent after the tunnel's threads ran dry
-
-    for (size_t i = 0; i < row.codes.size(); ++i) {
-        const int n = int(i) + 1;
-        ASSERT_EQ(site.replies.replyCount(n), 1) << "request " << n;
-        EXPECT_EQ(site.replies.waitForFirst(n, {})->code, row.codes[i]) << "request " << n;
+    host.site.tunnel.deliverAll(); // what was sent after the tunnel's threads ran dry
+    const QStringList codes = QString::fromLatin1(GetParam().codes).split(u' ');
+    for (int n = 1; n <= codes.size(); ++n) {
+        ASSERT_EQ(host.site.replies.replyCount(n), 1) << "request " << n;
+        EXPECT_EQ(host.site.replies.waitForFirst(n, {})->code, codes[n - 1]) << "request " << n;
     }
 }
 
