@@ -13,14 +13,14 @@ void replyFailure(const ResponseCallback &reply)
 QSharedPointer<IRecordingSettingControl> LifetimeGuard::control() const
 {
     QSharedPointer<IRecordingSettingControl> control;
-    m_lifetime->runIfAlive([&] { control = m_control; });
+    m_lifetime->lockedIfAlive([&] { control = m_control; });
     return control;
 }
 
 void LifetimeGuard::setControl(QSharedPointer<IRecordingSettingControl> control)
 {
     QSharedPointer<IRecordingSettingControl> previous;
-    m_lifetime->runIfAlive([&] {
+    m_lifetime->lockedIfAlive([&] {
         previous = std::move(m_control);
         m_control = std::move(control);
     });

@@ -12,8 +12,8 @@ PluginRecordingScheduleSettingSrv::~PluginRecordingScheduleSettingSrv()
 {
     {
         TRACE_SCOPE("PluginRecordingScheduleSettingSrv::~PluginRecordingScheduleSettingSrv");
-        // Waits for a completion that is running now; later ones answer on
-        // their own without touching this object.
+        // Waits for the completions running now on other threads; later ones
+        // answer on their own without touching this object.
         m_lifetime.end();
     }
     // The control is released after the Leave record, with the members.

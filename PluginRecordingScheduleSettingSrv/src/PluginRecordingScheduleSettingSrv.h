@@ -97,6 +97,6 @@ private:
                                         QList<QVariant> cameras, QList<int> timecardIds,
                                         ResponseCallback reply);
 
-    // The control, and the lock that every completion runs under.
+    // The control, and the count of completions the destructor waits for.
     LifetimeGuard m_lifetime;
 };

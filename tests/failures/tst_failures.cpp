@@ -12,6 +12,8 @@
 
 #include <gtest/gtest.h>
 
+#include <atomic>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <thread>
@@ -303,5 +305,87 @@ INSTANTIATE_TEST_SUITE_P(Chains, Concurrent,
                          ::testing::Values(Meanwhile::Nothing, Meanwhile::ReplaceControls,
                                            Meanwhile::DeletePlugins),
                          [](const auto &info) { return RunNames[int(info.param)]; });
+
+// Hosts that act inside their replies, which come on 1 or 2 threads taking the
+// held answers in turn (the test's own first); requests 1 and 2 ask
+// "GetAllScheduleRecInfo" before any answer. A wait that would deadlock gives
+// up after 5 s and fails the row. Labelled "threads".
+struct Host
+{
+    Site site{TestTunnel::Delivery::Held};
+    void (*inside)(Host &, int request) = nullptr;
+    std::thread helper;
+    std::atomic<int> counted = 0;
+    const std::chrono::steady_clock::time_point deadline =
+        std::chrono::steady_clock::now() + std::chrono::seconds(5);
+
+    void ask(int n)
+    {
+        site.plugin->Request(u"GetAllScheduleRecInfo"_s, {}, {},
+                             [this, n, record = site.replies.replyFunction(n)](auto... reply) {
+                                 record(reply...);
+                                 inside(*this, n);
+                             });
+    }
+    // Counts in and waits until another thread has counted in too.
+    bool joinedByAnother()
+    {
+        for (++counted; counted < 2 && std::chrono::steady_clock::now() < deadline;)
+            std::this_thread::yield();
+        return counted >= 2;
+    }
+};
+
+struct HostRow
+{
+    const char *name;
+    int tunnelThreads;
+    const char *codes; // the replies of requests 1, 2, ...
+    void (*inside)(Host &, int request);
+    friend void PrintTo(const HostRow &row, std::ostream *os) { *os << row.name; }
+};
+
+const HostRow HostRows[] = {
+    {"reply_asks_again_from_inside_the_reply", 1, "0 0 0",
+     [](Host &host, int n) { n == 1 ? host.ask(3) : void(); }},
+    {"reply_deletes_the_plugin_and_the_answer_after_it_comes_late", 1, "0 -1",
+     [](Host &host, int n) { n == 1 ? host.site.plugin.reset() : void(); }},
+    {"reply_waits_until_a_request_on_another_thread_has_returned", 1, "0 0 0",
+     [](Host &host, int n) {
+         if (n == 1)
+             host.helper = std::thread([&host] { host.ask(3), ++host.counted; });
+         EXPECT_TRUE(n != 1 || host.joinedByAnother()) << "Request blocked by the reply";
+     }},
+    {"answers_on_two_threads_run_at_once_and_one_reply_deletes_the_plugin", 2, "0 0",
+     [](Host &host, int n) {
+         EXPECT_TRUE(host.joinedByAnother()) << "answers one at a time";
+         n == 1 ? host.site.plugin.reset() : void();
+     }},
+};
+
+class HostReplies : public ::testing::TestWithParam<HostRow>
+{};
+
+TEST_P(HostReplies, NoDeadlockAndOneReplyEach)
+{
+    Host host;
+    host.inside = GetParam().inside;
+    host.ask(1), host.ask(2);
+    std::thread second(
+        [&] { GetParam().tunnelThreads == 2 ? host.site.tunnel.deliverAll() : void(); });
+    host.site.tunnel.deliverAll();
+    second.join();
+    if (host.helper.joinable())
+        host.helper.join();
+    host.site.tunnel.deliverAll(); // what was sent after the tunnel's threads ran dry
+    const QStringList codes = QString::fromLatin1(GetParam().codes).split(u' ');
+    for (int n = 1; n <= codes.size(); ++n) {
+        ASSERT_EQ(host.site.replies.replyCount(n), 1) << "request " << n;
+        EXPECT_EQ(host.site.replies.waitForFirst(n, {})->code, codes[n - 1]) << "request " << n;
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(Host, HostReplies, ::testing::ValuesIn(HostRows),
+                         [](const auto &info) { return std::string(info.param.name); });
 
 } // namespace
