@@ -23,12 +23,8 @@ struct CommandRow
     QString code;
     QVariant data = QVariant();
     QStringList alter = {}; // SQL run on the server's file after the seed
+    friend void PrintTo(const CommandRow &row, std::ostream *os) { *os << row.name; }
 };
-
-inline void PrintTo(const CommandRow &row, std::ostream *os)
-{
-    *os << row.name;
-}
 
 // A "GetRecTmcardRes" text holding the time cards written compactly.
 QString seedDocument(const QString &timecards);

@@ -57,54 +57,20 @@ INSTANTIATE_TEST_SUITE_P(
                    QVariantMap{{"TimeCardID", "05"}}, "GetRecTmcard(all)", "", true, "-1"}),
     rowName<CommandRow>);
 
-// A document in the plug-in's own form, added, reads back the same.
-struct RoundTripRow
+// A document in the plug-in's own form, added as time card 2 beside the
+// fresh server's time card 1, reads back the same; its mode needs escaping in
+// XML and in JSON.
+TEST(RoundTrip, ReadsBackTheDocumentAdded)
 {
-    const char *name;
-    QString document;
-};
-
-void PrintTo(const RoundTripRow &row, std::ostream *os)
-{
-    *os << row.name;
-}
-
-class RoundTrip : public ::testing::TestWithParam<RoundTripRow>
-{};
-
-// Time card 2 beside the fresh server's time card 1.
-TEST_P(RoundTrip, ReadsBackTheDocumentAdded)
-{
+    const QString document =
+        R"({"Rectangles":[{"Bottom":1,"Left":0,"RecordingMode":"Rec \"A\" \\ <b>&","Right":1,)"
+        R"("Top":0}]})";
     LivePlugin live;
-    const QVariantMap add{{"ScheduleName", "Trip"}, {"timeframes", GetParam().document}};
+    const QVariantMap add{{"ScheduleName", "Trip"}, {"timeframes", document}};
     ASSERT_EQ(live.request("AddSchedule", add).data.toString().toStdString(), "2");
     const QVariantList all = live.request("GetAllScheduleRecInfo", QVariant()).data.toList();
     EXPECT_EQ(all.value(1).toMap()["CustomizeContent"].toString().toStdString(),
-              GetParam().document.toStdString());
+              document.toStdString());
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    Documents, RoundTrip,
-    ::testing::Values(
-        RoundTripRow{
-            "mode that needs escaping in XML and in JSON",
-            R"({"Rectangles":[{"Bottom":1,"Left":0,"RecordingMode":"Rec \"A\" \\ <b>&","Right":1,)"
-            R"("Top":0}]})"},
-        RoundTripRow{
-            "event with every trigger, in the form the plug-in writes it",
-            R"({"Rectangles":[{"Bottom":2,"Left":1,"RecordingMode":"Event","Right":3,"Top":1,)"
-            R"("triggerEvents":{"motion":false,"pir":true,"tampering":false,"pptz":true,)"
-            R"("lineDetection":true,"fieldDetection":false,"loitering":true,"crowdDetection":false,)"
-            R"("missingObject":true,"abandonObject":false,"faceDetection":true,"zoneDetection":true,)"
-            R"("smartTracking":false,"runningDetection":true,"parkingViolationDetection":false,)"
-            R"("restrictedZoneDetection":true,"temperatureThresholdWarning":false,)"
-            R"("temperatureThresholdAlarm":true,"temperatureDifferenceWarning":false,)"
-            R"("temperatureDifferenceAlarm":true,"temperatureRiseWarning":false,)"
-            R"("temperatureRiseAlarm":true,"temperatureSectionAlarm":false,"thermalIntrusion":true,)"
-            R"("thermalMultiLoitering":false,"fireSpotDetection":true,"smokerDetection":false,)"
-            R"("smokeAndFlameDetection":true,"di":true,)"
-            R"("traditional":true,"recordingStateTrigger":false,"recordingStateNormal":true,)"
-            R"("activatedToNormal":false,"normalToActivated":true}}]})"}),
-    rowName<RoundTripRow>);
 
 } // namespace

@@ -45,12 +45,8 @@ struct Row
     const char *name;
     std::function<void(Object &)> act;
     QByteArray written; // in hex
+    friend void PrintTo(const Row &row, std::ostream *os) { *os << row.name; }
 };
-
-void PrintTo(const Row &row, std::ostream *os)
-{
-    *os << row.name;
-}
 
 class DataObject : public ::testing::TestWithParam<Row>
 {};

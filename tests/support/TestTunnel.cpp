@@ -1,6 +1,5 @@
 #include "TestTunnel.h"
 
-
 TestTunnel::~TestTunnel()
 {
     locked([&] { m_stopping = true; });
@@ -28,12 +27,8 @@ bool TestTunnel::SendRequest(const QString &pluginId, void *clientId, int kind,
     if (m_refusal && m_refusal(sent))
         return false;
     m_sent.append(sent);
-    if (m_responder) {
+    if (m_responder)
         held.second = m_responder(sent);
-    } else if (!m_answers.empty()) {
-        held.second = m_answers.front();
-        m_answers.pop_front();
-    }
     if (m_delivery == Delivery::Immediately) {
         lock.unlock();
         deliver(held);

@@ -37,8 +37,8 @@ public:
         bool flag = false;
     };
     enum class Delivery { Immediately, Held, OtherThread };
-    // Answers one send, under the tunnel's lock. Without one, answers come
-    // from the queue; an empty queue answers ok, code "0", no content.
+    // Answers one send, under the tunnel's lock. Without one, every answer
+    // is ok, code "0", no content.
     using Responder = std::function<Answer(const Sent &)>;
 
     explicit TestTunnel(Delivery delivery = Delivery::Immediately) : m_delivery(delivery) {}
@@ -47,10 +47,6 @@ public:
     void setResponder(Responder responder)
     {
         locked([&] { m_responder = std::move(responder); });
-    }
-    void queueAnswer(const Answer &answer)
-    {
-        locked([&] { m_answers.push_back(answer); });
     }
     // Every send the predicate picks is refused.
     void setRefusal(std::function<bool(const Sent &)> refuse)
@@ -100,7 +96,6 @@ private:
     std::condition_variable m_idle;
     const Delivery m_delivery;
     Responder m_responder;
-    std::deque<Answer> m_answers;
     std::function<bool(const Sent &)> m_refusal;
     QList<Sent> m_sent;
     std::deque<Held> m_held;
