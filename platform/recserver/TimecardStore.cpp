@@ -57,6 +57,17 @@ bool isFixedName(const QString &name)
 
 // Decides from reads alone whether the file is ours, new or neither, so that
 // a file that is not ours is left byte for byte as it was.
+// A file whose schema version this server does not know; checked before the
+// file is touched, and again inside the transaction that sets the schema up.
+Refusal unknownVersion(const QString &path, int found, int knownVersion)
+{
+    return {ServerCode::StorageFailure,
+            QStringLiteral("%1: schema version %2, this server knows %3")
+                .arg(path)
+                .arg(found)
+                .arg(knownVersion)};
+}
+
 Refusal inspect(const QSqlDatabase &db, const QString &path, int knownVersion)
 {
     QSqlQuery query(db);
@@ -67,11 +78,7 @@ Refusal inspect(const QSqlDatabase &db, const QString &path, int knownVersion)
         return openFailure(path, QStringLiteral("not a database"), query.lastError());
     const int version = query.value(0).toInt();
     if (version != 0 && version != knownVersion)
-        return {ServerCode::StorageFailure,
-                QStringLiteral("%1: schema version %2, this server knows %3")
-                    .arg(path)
-                    .arg(version)
-                    .arg(knownVersion)};
+        return unknownVersion(path, version, knownVersion);
     if (version == 0 && hasTables)
         return {ServerCode::StorageFailure,
                 QStringLiteral("%1: not a time card database: it holds tables of another kind")
@@ -250,11 +257,7 @@ Refusal TimecardStore::prepareSchema(const QSqlDatabase &db, const QString &path
     const int found = version.value(0).toInt();
     version.finish();
     if (found != 0 && found != kSchemaVersion)
-        return {ServerCode::StorageFailure,
-                QStringLiteral("%1: schema version %2, this server knows %3")
-                    .arg(path)
-                    .arg(found)
-                    .arg(kSchemaVersion)};
+        return unknownVersion(path, found, kSchemaVersion);
     if (found == 0) {
         const QSqlError error = createSchema(transaction);
         if (error.isValid())
